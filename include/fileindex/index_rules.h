@@ -1,0 +1,64 @@
+#ifndef FILEINDEX_INDEX_RULES_H
+#define FILEINDEX_INDEX_RULES_H
+
+#include <json/value.h>
+#include <string>
+#include <vector>
+
+#include <fileindex/export.h>
+#include <fileindex/folder.h>
+
+struct _tag_VANOSHARE;
+
+// What may be indexed at all, and which folder setting governs a path. Pure decisions over the file
+// system and the platform's share properties: they change nothing and take no lock.
+
+namespace VANO::FILEINDEX {
+
+/// @param share the platform's share record; null is refused.
+/// @return false for the shares "surveillance" and "NetBackup", for encrypted and read-only shares,
+///         and when a property cannot be read. Nothing is logged.
+FILEINDEX_API bool CanShareBeIndexed(_tag_VANOSHARE *share);
+
+/// @param fileName a single name, not a path.
+/// @return whether the name is reserved by the system: a hidden metadata directory of the platform,
+///         the library's own per-share names, or a desktop's droppings.
+FILEINDEX_API bool IsSystemPreservedFileName(const std::string &fileName);
+
+/// Whether a file must be left out of the index: a reserved name, something in a recycle bin or a
+/// snapshot, a remote, image or user-space file system. An unknown file system is not left out.
+///
+/// @param fullPath absolute file-system path.
+/// @return true to leave it out.
+FILEINDEX_API bool IsSkipIndex(const std::string &fullPath);
+
+/// @return whether 10 MiB can still be written to the share. False for an unknown share, with one
+///         line logged; a check that fails for another reason than a full quota or volume counts as
+///         enough.
+FILEINDEX_API bool IsShareSpaceEnough(const std::string &shareName);
+
+/// Whether a folder may be indexed: on a local, known file system, in a share that may be indexed,
+/// outside recycle bins and snapshots, no mount point of its own and without symbolic links or
+/// other detours in its path.
+///
+/// @param fullPath absolute file-system path.
+/// @return false with at most one line logged by this operation.
+FILEINDEX_API bool CanFullPathBeIndexed(const std::string &fullPath);
+
+/// CanFullPathBeIndexed() of a share path.
+///
+/// @return false, with the last error FILEINDEX_ERR_PATH and one line logged, when it cannot be
+///         resolved.
+FILEINDEX_API bool CanPathBeIndexed(const std::string &sharePath);
+
+/// The setting that governs a path: the last of `folders` that is the path or contains it. In the
+/// order of the settings file that is the deepest one.
+///
+/// @param fullPath absolute file-system path.
+/// @return the setting as JSON, or an empty object.
+FILEINDEX_API Json::Value GetMostSuitableCfg(std::vector<Folder> folders,
+                                             const std::string &fullPath);
+
+} // namespace VANO::FILEINDEX
+
+#endif

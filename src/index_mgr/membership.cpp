@@ -1,0 +1,123 @@
+#include <fileindex/fileindex.h>
+#include <fileindex/folders.h>
+#include <fileindex/index_mgr.h>
+#include <fileindex/share_path.h>
+
+#include <algorithm>
+#include <exception>
+
+#include "base/log.h"
+#include "folders/full_path_of.h"
+#include "index_mgr/unit.h"
+#include "utils/contains.h"
+
+namespace VANO::FILEINDEX {
+
+namespace {
+
+bool EndsInSlash(const std::string &path) {
+    return !path.empty() && path.back() == '/';
+}
+
+// A path that is asked about with a trailing "/" meets only folders that are stored with one.
+bool MayMeet(const std::string &asked, const std::string &stored) {
+    return !EndsInSlash(asked) || EndsInSlash(stored);
+}
+
+// Answers no when the settings cannot be loaded, or not within the memory there is: a query never
+// throws.
+template <typename Query>
+bool AskSettings(Query query) {
+    try {
+        std::vector<Folder> folders;
+        return IndexMgr::List(folders) && query(folders);
+    } catch (const std::exception &) {
+        return false;
+    }
+}
+
+// The same for a caller in C.
+template <typename Query>
+int AskFor(const char *what, Query query) {
+    try {
+        return what != nullptr && query(std::string(what)) ? 1 : 0;
+    } catch (const std::exception &) {
+        return 0;
+    }
+}
+
+} // namespace
+
+bool IndexMgr::List(std::vector<Folder> &folders) {
+    Folders settings;
+    return settings.Load() && settings.List(folders);
+}
+
+bool IndexMgr::IsShareIndexed(const std::string &share) {
+    return AskSettings([&](const std::vector<Folder> &folders) {
+        return std::any_of(folders.begin(), folders.end(), [&](const Folder &folder) {
+            std::string shareOfFolder;
+            if (!GetShareNameByPath(shareOfFolder, folder.path)) {
+                LogError(kIndexMgrUnit, __LINE__, "Failed to get share name from path: %s",
+                         folder.path.c_str());
+                return false;
+            }
+            return shareOfFolder == share;
+        });
+    });
+}
+
+bool IndexMgr::IsPathIndexed(const std::string &path, const std::vector<Folder> &folders) {
+    return std::any_of(folders.begin(), folders.end(), [&](const Folder &folder) {
+        return MayMeet(path, folder.path) && IsSameOrBelow(path, folder.path);
+    });
+}
+
+bool IndexMgr::IsPathContainIndexed(const std::string &path, const std::vector<Folder> &folders) {
+    return std::any_of(folders.begin(), folders.end(), [&](const Folder &folder) {
+        return MayMeet(path, folder.path) && IsSameOrBelow(folder.path, path);
+    });
+}
+
+bool IndexMgr::IsFullPathIndexed(const std::string &fullPath, const std::vector<Folder> &folders) {
+    std::string scratch;
+    return std::any_of(folders.begin(), folders.end(), [&](const Folder &folder) {
+        const std::string &full = FullPathOf(folder, scratch);
+        // A folder that no longer resolves covers nothing.
+        return !full.empty() && MayMeet(fullPath, full) && IsSameOrBelow(fullPath, full);
+    });
+}
+
+bool IndexMgr::IsPathIndexed(const std::string &path) {
+    return AskSettings(
+        [&](const std::vector<Folder> &folders) { return IsPathIndexed(path, folders); });
+}
+
+bool IndexMgr::IsPathContainIndexed(const std::string &path) {
+    return AskSettings(
+        [&](const std::vector<Folder> &folders) { return IsPathContainIndexed(path, folders); });
+}
+
+bool IndexMgr::IsFullPathIndexed(const std::string &fullPath) {
+    return AskSettings(
+        [&](const std::vector<Folder> &folders) { return IsFullPathIndexed(fullPath, folders); });
+}
+
+} // namespace VANO::FILEINDEX
+
+using VANO::FILEINDEX::IndexMgr;
+
+int FILEIDXIsShareIndexed(const char *szShare) {
+    return VANO::FILEINDEX::AskFor(
+        szShare, [](const std::string &share) { return IndexMgr::IsShareIndexed(share); });
+}
+
+int FILEIDXIsPathIndexed(const char *szPath) {
+    return VANO::FILEINDEX::AskFor(
+        szPath, [](const std::string &path) { return IndexMgr::IsPathIndexed(path); });
+}
+
+int FILEIDXIsFullPathIndexed(const char *szFullPath) {
+    return VANO::FILEINDEX::AskFor(
+        szFullPath, [](const std::string &path) { return IndexMgr::IsFullPathIndexed(path); });
+}

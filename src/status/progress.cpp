@@ -1,0 +1,147 @@
+#include <fileindex/status_mgr.h>
+
+#include <ctime>
+#include <fileindex/index_mgr.h>
+#include <fileindex/index_rules.h>
+#include <fileindex/share_path.h>
+#include <set>
+
+#include "base/log.h"
+#include "config/paths.h"
+#include "utils/contains.h"
+#include "utils/event_codes.h"
+#include "utils/queue_reader.h"
+#include "utils/share_location.h"
+
+namespace VANO::FILEINDEX {
+
+namespace {
+
+constexpr char kUnit[] = "status_mgr";
+constexpr char kFinished[] = "finished";
+constexpr char kProcessing[] = "processing";
+constexpr char kPaused[] = "paused";
+constexpr char kNoSpace[] = "err_no_space";
+constexpr long long kNotPaused = -1;
+
+// Whether the queue file holds an event at or under the folder. Reads the whole file, so that each
+// malformed line in it is logged.
+bool IsPathInQueue(const std::string &path, const std::string &queueFile) {
+    if (!IsFileExist(queueFile)) {
+        return false;
+    }
+    std::string folder;
+    if (!GetFullPath(folder, path)) {
+        LogError(kUnit, 30, "Cannot get full path: %s", path.c_str());
+        return false;
+    }
+    QueueReader reader(queueFile);
+    if (!reader.IsOpen()) {
+        LogError(kUnit, 37, "Failed to open queue=%s, reason=%s", queueFile.c_str(),
+                 ErrnoText().c_str());
+        return false;
+    }
+    bool found = false;
+    std::string line;
+    QueueEvent event{};
+    // The former path of the last move stands for every later event too, whatever its code.
+    std::string formerPath;
+    while (reader.NextLine(line)) {
+        if (!reader.ParseEvent(event, line)) {
+            LogError(kUnit, 47, "Malformed command: %s", line.c_str());
+            continue;
+        }
+        if (event.code == kEventMoved) {
+            formerPath.swap(event.formerPath);
+        }
+        found = found || IsSameOrBelow(event.path, folder) || IsSameOrBelow(formerPath, folder);
+    }
+    return found;
+}
+
+const char *WaitingStatus(long long resumeTime) {
+    return resumeTime != 0 && resumeTime <= static_cast<long long>(::time(nullptr)) ? kProcessing
+                                                                                    : kPaused;
+}
+
+// False, with one line logged, when the share is unknown.
+bool GetQueueLocation(std::string &queue, const std::string &share, int line) {
+    if (!GetLocation(queue, FILEIDXQueuePathGet, share)) {
+        LogError(kUnit, line, "FILEIDXQueuePathGet failed, share=%s", share.c_str());
+        return false;
+    }
+    return true;
+}
+
+// The shares of the folders that can be indexed. False, with one line logged, when a share cannot
+// be told.
+bool ListIndexableShares(std::set<std::string> &shares, const std::vector<Folder> &folders) {
+    for (const Folder &folder : folders) {
+        std::string share;
+        if (!GetShareNameByPath(share, folder.path)) {
+            LogError(kUnit, 135, "Failed to get share name from path: %s", folder.path.c_str());
+            return false;
+        }
+        if (CanPathBeIndexed(folder.path)) {
+            shares.insert(share);
+        }
+    }
+    return true;
+}
+
+} // namespace
+
+std::string StatusMgr::GetFolderStatus(const std::string &path) {
+    if (!CanPathBeIndexed(path)) {
+        return kPaused;
+    }
+    std::string share;
+    if (!GetShareNameByPath(share, path)) {
+        LogError(kUnit, 88, "Failed to get share name from path: %s", path.c_str());
+        return kFinished;
+    }
+    if (ShareIsNoSpace(share)) {
+        return kNoSpace;
+    }
+    std::string queue;
+    if (!GetQueueLocation(queue, share, 100)) {
+        return kFinished;
+    }
+    long long resumeTime = kNotPaused;
+    (void)GetPauseInfo(resumeTime); // a pause that cannot be read is none
+    if (!IsPathInQueue(path, queue) && !IsPathInQueue(path, queue + kTakenQueueSuffix)) {
+        return kFinished;
+    }
+    return WaitingStatus(resumeTime);
+}
+
+bool StatusMgr::GetStatus(std::string &status) {
+    std::vector<Folder> folders;
+    std::set<std::string> shares;
+    if (!IndexMgr::List(folders) || !ListIndexableShares(shares, folders)) {
+        return false;
+    }
+    bool waiting = false;
+    for (const std::string &share : shares) {
+        std::string queue;
+        if (!GetQueueLocation(queue, share, 146)) {
+            return false;
+        }
+        if (IsFileExist(queue) || IsFileExist(queue + kTakenQueueSuffix)) {
+            waiting = true;
+            break;
+        }
+    }
+    if (!waiting) {
+        status = kFinished;
+        return true;
+    }
+    long long resumeTime = kNotPaused;
+    if (!GetPauseInfo(resumeTime)) {
+        return false;
+    }
+    status = WaitingStatus(resumeTime);
+    return true;
+}
+
+} // namespace VANO::FILEINDEX

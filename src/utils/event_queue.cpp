@@ -1,0 +1,187 @@
+#include <fileindex/event_queue.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <fcntl.h>
+#include <fileindex/config.h>
+#include <fileindex/share_path.h>
+#include <fileindex/status_mgr.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "base/json_io.h"
+#include "base/log.h"
+#include "base/unique_fd.h"
+#include "config/lock_retry.h"
+#include "config/paths.h"
+#include "utils/event_codes.h"
+#include "utils/queue_reader.h"
+#include "utils/share_location.h"
+#include "utils/share_of_full_path.h"
+
+namespace VANO::FILEINDEX {
+
+namespace {
+
+constexpr char kUnit[] = "utils";
+
+bool IsVerbose() {
+    return LOG_LEVEL == 7;
+}
+
+// Whether the line can hold the path at all. Without an escape in it every string of a line stands
+// there byte for byte; a search costs a fraction of reading the line as JSON.
+bool CanHold(const std::string &line, const std::string &path) {
+    return line.find(path) != std::string::npos || line.find('\\') != std::string::npos;
+}
+
+// Whether a re-index of exactly this path waits in the queue file.
+bool IsPathReindexQueued(const std::string &fullPath, const std::string &queueFile) {
+    if (!IsFileExist(queueFile)) {
+        return false;
+    }
+    QueueReader reader(queueFile);
+    if (!reader.IsOpen()) {
+        LogError(kUnit, 95, "Failed to open queue=%s, reason=%s", queueFile.c_str(),
+                 ErrnoText().c_str());
+        return false;
+    }
+    std::string line;
+    QueueEvent event{};
+    while (reader.NextLine(line)) {
+        if (CanHold(line, fullPath) && reader.ParseEvent(event, line) &&
+            event.code == kEventReindexFolder && event.path == fullPath) {
+            return true;
+        }
+    }
+    return false;
+}
+
+// Users can write beside the queue: nothing but a regular file of that very name is appended to.
+UniqueFd OpenQueue(const std::string &queueFile) {
+    UniqueFd queue(::open(queueFile.c_str(),
+                          O_WRONLY | O_APPEND | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC,
+                          0666));
+    struct stat info {};
+    if (!queue || ::fstat(queue.Get(), &info) != 0 || !S_ISREG(info.st_mode)) {
+        return UniqueFd();
+    }
+    return queue;
+}
+
+// Between opening the queue and locking it the daemon may have taken it over: what is written to
+// that file then is lost.
+bool IsStillTheQueue(const UniqueFd &queue, const std::string &queueFile) {
+    struct stat opened {};
+    struct stat named {};
+    return ::fstat(queue.Get(), &opened) == 0 && ::lstat(queueFile.c_str(), &named) == 0 &&
+           opened.st_dev == named.st_dev && opened.st_ino == named.st_ino;
+}
+
+void WriteAndUnlock(const UniqueFd &queue, const std::string &line) {
+    const ssize_t written = ::write(queue.Get(), line.data(), line.size());
+    if (written < static_cast<ssize_t>(line.size()) && IsVerbose()) {
+        LogError(kUnit, 502, "write fail, (%ld, %ld)", static_cast<long>(written),
+                 static_cast<long>(line.size()));
+    }
+    (void)::flock(queue.Get(), LOCK_UN);
+}
+
+enum class Append { kDone, kBusy, kFailed };
+
+Append TryToAppend(const std::string &queueFile, const std::string &line) {
+    const UniqueFd queue = OpenQueue(queueFile);
+    if (!queue) {
+        return Append::kFailed;
+    }
+    if (::flock(queue.Get(), LOCK_EX | LOCK_NB) != 0) {
+        if (IsLockBusy(errno)) {
+            return Append::kBusy;
+        }
+        if (IsVerbose()) {
+            LogError(kUnit, 507, "flock fail, path=%s, reason=%s", queueFile.c_str(),
+                     ErrnoText().c_str());
+        }
+        return Append::kFailed;
+    }
+    if (!IsStillTheQueue(queue, queueFile)) {
+        errno = EAGAIN;
+        return Append::kBusy;
+    }
+    WriteAndUnlock(queue, line);
+    return Append::kDone;
+}
+
+// False when the queue cannot be opened or locked at all. One that only stays busy drops the line,
+// which counts as done.
+bool AppendLine(const std::string &queueFile, const std::string &line) {
+    for (int attempt = 0; attempt < kLockAttempts; ++attempt) {
+        const Append result = TryToAppend(queueFile, line);
+        if (result != Append::kBusy) {
+            return result == Append::kDone;
+        }
+        const int busy = errno;
+        PauseBeforeNextLockAttempt();
+        errno = busy;
+    }
+    if (IsVerbose()) {
+        LogError(kUnit, 516, "try lock too many times, path=%s, reason=%s", queueFile.c_str(),
+                 ErrnoText().c_str());
+    }
+    return true;
+}
+
+std::string EventLine(int event, const std::string &fullPath, const Json::Value &data) {
+    Json::Value object(Json::objectValue);
+    object["event"] = event;
+    object["path"] = fullPath;
+    object["data"] = data;
+    return JsonToString(object) + "\n";
+}
+
+// False when the event could not be handed to the queue. `shareName` is left empty when the path
+// lies in no share.
+bool QueueEventOnce(std::string &shareName, int event, const std::string &fullPath,
+                    const Json::Value &data) {
+    ShareOfFullPath found;
+    if (!FindShareOfFullPath(found, fullPath)) {
+        LogError(kUnit, 472, "VANOShareNamePathGet failed, path=%s", fullPath.c_str());
+        return false;
+    }
+    shareName = found.name.data();
+    std::string queueFile;
+    if (!GetLocation(queueFile, FILEIDXQueuePathGet, shareName)) {
+        LogError(kUnit, 478, "FILEIDXQueuePathGet failed, share=%s", shareName.c_str());
+        return false;
+    }
+    if (IsPathReindexQueued(fullPath, queueFile) ||
+        IsPathReindexQueued(fullPath, queueFile + kTakenQueueSuffix)) {
+        return true;
+    }
+    return AppendLine(queueFile, EventLine(event, fullPath, data));
+}
+
+// A status file of an unexpected shape makes the JSON library throw: the mark is then not set.
+bool MarkNeedReindex(const std::string &shareName) {
+    try {
+        return StatusMgr::ShareSetNeedReindex(shareName, true);
+    } catch (const Json::Exception &) {
+        return false;
+    }
+}
+
+} // namespace
+
+bool AddCustomEvent(const int &event, const std::string &fullPath, const Json::Value &data) {
+    std::string shareName;
+    if (QueueEventOnce(shareName, event, fullPath, data)) {
+        return true;
+    }
+    if (!MarkNeedReindex(shareName)) {
+        LogError(kUnit, 522, "ShareSetNeedReindex failed, share=%s", shareName.c_str());
+    }
+    return false;
+}
+
+} // namespace VANO::FILEINDEX

@@ -1,0 +1,50 @@
+#ifndef FILEINDEX_UTILS_QUEUE_READER_H
+#define FILEINDEX_UTILS_QUEUE_READER_H
+
+#include <array>
+#include <json/value.h>
+#include <string>
+
+#include "base/json_io.h"
+#include "base/unique_fd.h"
+
+namespace VANO::FILEINDEX {
+
+// One event of a queue file: a line that is a JSON object with an "event" that converts to an
+// unsigned integer and a string "path".
+struct QueueEvent {
+    unsigned int code;
+    std::string path;
+    std::string formerPath; // "path_old" of a moved item; empty when absent or no text
+};
+
+// Reads a queue file line by line. Memory grows with the longest line alone, not with the file.
+class QueueReader {
+  public:
+    // Opens the queue; a symbolic link in its place is not followed. Reading never blocks.
+    explicit QueueReader(const std::string &path);
+
+    // Whether the queue could be opened; errno says why not.
+    [[nodiscard]] bool IsOpen() const { return static_cast<bool>(file_); }
+
+    // The next line without its newline; the last one may lack it. False at the end of the file or
+    // at a read error.
+    [[nodiscard]] bool NextLine(std::string &line);
+
+    // Whether a line is an event; `event` is unspecified when it is not.
+    [[nodiscard]] bool ParseEvent(QueueEvent &event, const std::string &line);
+
+  private:
+    [[nodiscard]] bool Fill();
+
+    UniqueFd file_;
+    JsonParser parser_;
+    Json::Value parsed_;
+    std::array<char, std::size_t{64} * 1024> buffer_;
+    std::size_t begin_ = 0;
+    std::size_t end_ = 0;
+};
+
+} // namespace VANO::FILEINDEX
+
+#endif
