@@ -21,9 +21,9 @@ enum _tag_fileindex_err_ : int {
 
 /// The process-wide last error of the library.
 ///
-/// Every failing operation overwrites it and none sets it back to FILEINDEX_ERR_NONE, so it is
-/// worth reading right after an operation has returned false. It is a plain variable: with several
-/// threads the last writer wins.
+/// Failing operations whose description names a code overwrite it, others leave it alone, and none
+/// sets it back to FILEINDEX_ERR_NONE: whoever wants to tell sets that before the call. It is a
+/// plain variable: with several threads the last writer wins.
 class ErrorHandler {
   public:
     /// Makes `code` the last error.

@@ -27,9 +27,10 @@ FILEINDEX_API int FILEIDXIsFullPathIndexed(const char *szFullPath);
  *
  * @param szName      the share's name.
  * @param szOutDBPath receives the path, cut to `cbOutLen` bytes with its terminating zero.
+ *                    A cut path is created all the same: pass 4096 bytes.
  * @param cbOutLen    size of the buffer in bytes.
- * @return the length of the path written, or -1 for a bad argument or an unknown share, with one
- *         line logged.
+ * @return the length of the path written, or -1, with one line logged, for a bad argument (platform
+ *         error 0x0D00) or an unknown share.
  */
 FILEINDEX_API int FILEIDXDBPathGet(const char *szName, char *szOutDBPath, int cbOutLen);
 

@@ -21,8 +21,9 @@ class Folder {
     ///
     /// @param path share path ("/share/dir").
     /// @param obj  object in the form that asJson() gives; anything else counts as empty.
-    /// @return false when `path` cannot be resolved (last error FILEINDEX_ERR_PATH); the record is
-    ///         loaded all the same, with an empty `full_path`.
+    /// @return false when `path` cannot be resolved, as GetFullPath() of share_path.h says; the
+    /// record
+    ///         is loaded all the same, with an empty `full_path`.
     FILEINDEX_API bool Load(const std::string &path, const Json::Value &obj);
 
     /// Load() into a record whose name and file types were first set to empty and false.
@@ -30,7 +31,8 @@ class Folder {
 
     /// Makes `path` the record's share path and resolves it.
     ///
-    /// @return false when it cannot be resolved (last error FILEINDEX_ERR_PATH); `full_path` is
+    /// @return false when it cannot be resolved, as GetFullPath() of share_path.h says; `full_path`
+    /// is
     ///         then empty.
     FILEINDEX_API bool SetPath(const std::string &path);
 

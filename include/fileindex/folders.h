@@ -61,12 +61,14 @@ class FILEINDEX_API Folders : public Config {
     ///
     /// @param out            becomes an object with "total" (number of all settings), "offset" (as
     ///                       given) and "folder", an array of Folder::asJson(additional).
-    /// @param offset         index of the first record; ignored by a descending page.
+    /// @param offset         index of the first record. A descending page does not move with it: it
+    ///                       only becomes shorter, by as many records, unless the offset is beyond
+    ///                       the total.
     /// @param limit          the most records of the page.
     /// @param sort_by        "name", "document", "audio", "video" or "photo"; anything else sorts
     ///                       by path. Texts are compared without regard to case.
-    /// @param sort_direction "DESC" gives the first `limit` records of the ascending order,
-    ///                       reversed; anything else the ascending page from `offset`.
+    /// @param sort_direction "DESC" gives the first records of the ascending order, reversed;
+    ///                       anything else the ascending page from `offset`.
     /// @param additional     array of the additional facts wanted; see Folder::GetAdditional().
     /// @return always true.
     bool List(Json::Value &out, unsigned long offset, unsigned long limit,
@@ -76,10 +78,11 @@ class FILEINDEX_API Folders : public Config {
     /// Inserts or updates the setting that `param` describes.
     ///
     /// An update changes only what `param` holds; an insert starts from an empty name and no file
-    /// types.
+    /// types. Compares the folder with every setting; one whose path no longer resolves is logged.
     ///
     /// @param changes receives an object that says for each of "document", "audio", "video" and
-    ///                "photo" whether the rule that governs the folder has changed.
+    ///                "photo" whether the rule that governs the folder has changed. Untouched on
+    ///                failure.
     /// @param param   object with the string "path" (share path) and optionally "name" and the
     ///                four booleans.
     /// @return false when "path" is missing or cannot be resolved (FILEINDEX_ERR_BAD_PARAM), or
@@ -87,7 +90,8 @@ class FILEINDEX_API Folders : public Config {
     ///         object then holds one too many and is not to be saved). One line is logged.
     bool Upsert(Json::Value &changes, const Json::Value &param);
 
-    /// Removes the setting of `path`; a path that is not set is no error.
+    /// Removes the setting of `path`; a path that is not set is no error. Compares the path with
+    /// every setting, twice; one whose path no longer resolves is logged each time.
     ///
     /// @param changes receives an object with one member named `path`, holding the report as
     ///                Upsert() gives it. Untouched when `path` cannot be resolved.

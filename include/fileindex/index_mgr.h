@@ -12,8 +12,14 @@ namespace VANO::FILEINDEX {
 
 /// The public operations of the indexing service.
 ///
-/// Paths are share paths ("/share/dir") unless called full paths. Every failure is logged. Nothing
-/// is rolled back: an operation that fails part-way leaves what it had done.
+/// Paths are share paths ("/share/dir") unless called full paths. A failure is logged unless said
+/// otherwise. Nothing is rolled back: an operation that fails part-way leaves what it had done.
+///
+/// Operations that hold the folder-settings lock fail with FILEINDEX_ERR_LOCK when somebody else
+/// holds it for longer than about 30 ms. Those that load folder.conf fail with FILEINDEX_ERR_LOAD
+/// or FILEINDEX_ERR_MALFORMED, those that save it with FILEINDEX_ERR_SAVE. Commands to the daemon
+/// and control of services wait for the other side, with the lock held. Threads may call any of
+/// them at the same time.
 class IndexMgr {
   public:
     // --- Is it indexed? -------------------------------------------------------------------------
@@ -76,11 +82,13 @@ class IndexMgr {
     /// @param request array of share paths as stored in folder.conf; one that is not set is no
     ///        error.
     /// @return false at the first failing step. A request that is no array, or an element that is
-    ///         no text, is FILEINDEX_ERR_BAD_PARAM and changes nothing.
+    /// an
+    ///         array or an object, is FILEINDEX_ERR_BAD_PARAM and changes nothing.
     FILEINDEX_API static bool Delete(const Json::Value &request);
 
     /// Queues folders for a new index and revives those of their shares that ran out of space.
-    /// Takes no lock of its own.
+    /// Takes no lock of its own. Reads folder.conf and status.conf once for each share, and the
+    /// share's queue once for each path.
     ///
     /// @param jsArrPath array of share paths.
     /// @return false when it is no array of strings (FILEINDEX_ERR_BAD_PARAM), when a share has no
@@ -108,6 +116,10 @@ class IndexMgr {
                                    const Json::Value &additional);
 
     /// One folder setting as JSON; see Folders::Get(). Holds the folder-settings lock.
+    ///
+    /// @param out  receives the object; untouched on failure.
+    /// @param path share path as stored.
+    /// @return false when there is none (FILEINDEX_ERR_NO_SUCH_FOLDER).
     FILEINDEX_API static bool Get(Json::Value &out, const std::string &path);
 
     // --- Share lifecycle ------------------------------------------------------------------------
@@ -115,18 +127,34 @@ class IndexMgr {
     /// Drops the folder settings of a share that is being removed. With the last setting the
     /// daemon's service is stopped and Spotlight switched off. Nobody else is told, and the index
     /// data stays; see CleanShareIndexData(). Holds the folder-settings lock.
+    ///
+    /// @param share share name, compared byte for byte. An empty name stands for every share.
+    /// @return false when the settings cannot be locked, loaded or saved. A failing service or
+    ///         Spotlight is logged only.
     FILEINDEX_API static bool ShareRemove(const std::string &share);
 
     /// Moves the folder settings of a renamed share to its new name, which must already be known to
     /// the platform. Changes folder.conf only. Holds the folder-settings lock.
+    ///
+    /// @param oldName share name, compared byte for byte. An empty name stands for every share.
+    /// @param newName share name.
+    /// @return false when the settings cannot be locked, loaded or saved, or when the new name is
+    ///         unknown (FILEINDEX_ERR_BAD_PARAM); folder.conf is then unchanged.
     FILEINDEX_API static bool ShareRename(const std::string &oldName, const std::string &newName);
 
     /// Stops the daemon's worker of the share ("delete_share_worker"), then removes its monitor
     /// configuration. Takes no lock and leaves the status file alone.
+    ///
+    /// @return false when the daemon cannot be reached (nothing is logged or done), or the
+    ///         configuration not be removed.
     FILEINDEX_API static bool SharePause(const std::string &share);
 
     /// Rewrites the share's monitor configuration from the settings, then asks the daemon to start
     /// its worker ("revive_share_worker"). Takes no lock and leaves the status file alone.
+    ///
+    /// @return false when the configuration cannot be written, or the daemon not be reached
+    /// (nothing
+    ///         is logged).
     FILEINDEX_API static bool ShareResume(const std::string &share);
 
     /// Deletes the share's event queue, the queue that the daemon took over, and the index
@@ -145,6 +173,8 @@ class IndexMgr {
     FILEINDEX_API static bool UpsertVANotifydCfg(const std::string &share);
 
     /// Removes the monitor configuration that feeds the share's event queue. Takes no lock.
+    ///
+    /// @return false when the share is unknown or the monitor refuses.
     FILEINDEX_API static bool DeleteVANotifydCfg(const std::string &share);
 };
 

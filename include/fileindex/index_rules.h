@@ -41,19 +41,24 @@ FILEINDEX_API bool IsShareSpaceEnough(const std::string &shareName);
 /// outside recycle bins and snapshots, no mount point of its own and without symbolic links or
 /// other detours in its path.
 ///
+/// A path in no share is logged twice and sets FILEINDEX_ERR_PATH; an unknown share, a mount point
+/// and a path with detours are logged once; every other refusal is silent.
+///
 /// @param fullPath absolute file-system path.
-/// @return false with at most one line logged by this operation.
 FILEINDEX_API bool CanFullPathBeIndexed(const std::string &fullPath);
 
 /// CanFullPathBeIndexed() of a share path.
 ///
-/// @return false, with the last error FILEINDEX_ERR_PATH and one line logged, when it cannot be
-///         resolved.
+/// @param sharePath share path.
+/// @return false when that says so, and when the path cannot be resolved: the last error is then
+///         FILEINDEX_ERR_PATH and a line is logged.
 FILEINDEX_API bool CanPathBeIndexed(const std::string &sharePath);
 
 /// The setting that governs a path: the last of `folders` that is the path or contains it. In the
-/// order of the settings file that is the deepest one.
+/// order of the settings file that is the deepest one. A setting whose path no longer resolves is
+/// logged and governs nothing.
 ///
+/// @param folders  in the order of the settings file.
 /// @param fullPath absolute file-system path.
 /// @return the setting as JSON, or an empty object.
 FILEINDEX_API Json::Value GetMostSuitableCfg(std::vector<Folder> folders,

@@ -19,8 +19,10 @@ FILEINDEX_API bool GetShareNameByPath(std::string &name, const std::string &shar
 
 /// The full path of a share path: the directory that holds the share, and `sharePath` as given.
 ///
-/// @return false, with `fullPath` empty, when the path names no share (one line is logged) or the
-///         share is unknown (last error FILEINDEX_ERR_PATH, nothing logged).
+/// Costs one share lookup of the platform.
+///
+/// @return false, with `fullPath` empty, when the path is empty (one line is logged, no error set)
+///         or the share is unknown (last error FILEINDEX_ERR_PATH, nothing logged).
 FILEINDEX_API bool GetFullPath(std::string &fullPath, const std::string &sharePath);
 
 /// The share that a full path lies in, and the path in the platform's form.

@@ -10,8 +10,9 @@ namespace VANO::FILEINDEX {
 /// The process-safe face of the status file, and the progress report.
 ///
 /// Writers hold the exclusive lock "/tmp/fileidx_cfg_status.lock" for their whole run, the daemon
-/// command included. They return false when the lock, the load, the save or the command fails; a
-/// failed command leaves the change saved. Where status.conf holds a value of an unexpected JSON
+/// command included. They return false when the lock (FILEINDEX_ERR_LOCK), the load
+/// (FILEINDEX_ERR_LOAD), the save (FILEINDEX_ERR_SAVE) or the command fails; a failed command is
+/// logged and leaves the change saved. Where status.conf holds a value of an unexpected JSON
 /// type, an exception of the JSON library passes to the caller, with the lock released.
 ///
 /// Readers take no lock. A status file that cannot be loaded reads as false.
@@ -19,8 +20,8 @@ class StatusMgr {
   public:
     /// Writer. Pauses all indexing and tells the daemon ("pause").
     ///
-    /// @param hours duration; 0 for a pause without end. The end time is a 32-bit sum, so a
-    ///              duration beyond 2038 wraps and reads as not paused.
+    /// @param hours duration; 0 for a pause without end. The end time is a 32-bit sum: one beyond
+    ///              2038 wraps, and may read as not paused.
     /// @return false for a negative duration too: nothing is touched and the last error is
     ///         FILEINDEX_ERR_BAD_PARAM.
     FILEINDEX_API static bool Pause(const int &hours);
@@ -31,7 +32,7 @@ class StatusMgr {
     /// Reader. See Status::GetPauseInfo(); on false `resume_time` is unwritten.
     FILEINDEX_API static bool GetPauseInfo(long long &resume_time);
 
-    /// Writer. See Status::ShareSetNoSpace().
+    /// Writer. See Status::ShareSetNoSpace(); waits for the notification tool.
     FILEINDEX_API static bool ShareSetNoSpace(const std::string &share, bool no_space);
 
     /// Reader. @return whether the share is marked as out of space.

@@ -2,8 +2,10 @@
 
 #include <array>
 #include <cerrno>
+#include <climits>
 #include <cstdlib>
 #include <fcntl.h>
+#include <limits>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -64,14 +66,30 @@ std::string DirectoryOf(const std::string &path) {
     return slash == 0 ? "/" : path.substr(0, slash);
 }
 
-// Not every file system can flush a directory; on those the rename itself is all there is.
-bool FlushDirectory(const UniqueFd &directory) {
-    return ::fsync(directory.Get()) == 0 || errno == EINVAL;
+// The answers of a directory (or of a mount point) that lets its files be written, not replaced.
+bool IsReplacementRefused(int error) {
+    return error == EACCES || error == EPERM || error == EROFS || error == EBUSY;
+}
+
+// Gives `file` the owner and the mode of the file that it replaces.
+bool TakeOver(int file, const struct stat &old) {
+    struct stat fresh {};
+    if (::fstat(file, &fresh) != 0) {
+        return false;
+    }
+    if ((fresh.st_uid != old.st_uid || fresh.st_gid != old.st_gid) &&
+        ::fchown(file, old.st_uid, old.st_gid) != 0) {
+        // Written in place, the file keeps an owner that cannot be given away here.
+        errno = errno == EIO || errno == ENOSPC || errno == EDQUOT ? errno : EPERM;
+        return false;
+    }
+    // A mode that cannot be set does not keep the text from being saved.
+    (void)::fchmod(file, old.st_mode & 07777);
+    return true;
 }
 
 // `old` is the file being replaced, null when there is none.
 bool ReplaceFile(const std::string &path, std::string_view text, const struct stat *old) {
-    // Opened before anything changes, so that only the flush itself can fail after the rename.
     const UniqueFd directory(::open(DirectoryOf(path).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!directory) {
         return false;
@@ -80,39 +98,71 @@ bool ReplaceFile(const std::string &path, std::string_view text, const struct st
     if (file.Fd() < 0 || !WriteAll(file.Fd(), text)) {
         return false;
     }
-    if (old != nullptr && (old->st_uid != ::geteuid() || old->st_gid != ::getegid()) &&
-        ::fchown(file.Fd(), old->st_uid, old->st_gid) != 0) {
+    if (old != nullptr) {
+        if (!TakeOver(file.Fd(), *old)) {
+            return false;
+        }
+    } else {
+        (void)::fchmod(file.Fd(), kNewFileMode);
+    }
+    if (::fsync(file.Fd()) != 0 || !file.RenameOver(path)) {
         return false;
     }
-    // A mode that cannot be set does not keep the text from being saved.
-    (void)::fchmod(file.Fd(), old != nullptr ? old->st_mode & 07777 : kNewFileMode);
-    return ::fsync(file.Fd()) == 0 && file.RenameOver(path) && FlushDirectory(directory);
+    // The new text stands, whatever comes of this: a lost power line may bring the old one back.
+    (void)::fsync(directory.Get());
+    return true;
+}
+
+// Room is reserved before the old text is touched, so that a full disk leaves it whole. A file
+// system that cannot reserve is written to all the same.
+bool ReserveRoom(int file, off_t size) {
+    int result = 0;
+    do {
+        result = size > 0 ? ::fallocate(file, FALLOC_FL_KEEP_SIZE, 0, size) : 0;
+    } while (result != 0 && errno == EINTR);
+    return result == 0 || errno == EOPNOTSUPP || errno == ENOSYS;
+}
+
+// Makes `text` the whole content of a file that is open at its beginning.
+bool Overwrite(int file, std::string_view text) {
+    return WriteAll(file, text) && ::ftruncate(file, static_cast<off_t>(text.size())) == 0 &&
+           ::fsync(file) == 0;
+}
+
+// Removes a file that was made through `path`, which may be a symbolic link to it.
+void RemoveMadeFile(const std::string &path) {
+    std::array<char, PATH_MAX> target{};
+    if (::realpath(path.c_str(), target.data()) != nullptr) {
+        ::unlink(target.data());
+    }
 }
 
 bool RewriteInPlace(const std::string &path, std::string_view text) {
+    struct stat info {};
+    const bool exists = ::stat(path.c_str(), &info) == 0;
     const UniqueFd file(
         ::open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOCTTY, kNewFileMode));
-    struct stat info {};
     if (!file || ::fstat(file.Get(), &info) != 0) {
         return false;
     }
     if (!S_ISREG(info.st_mode)) {
         return WriteAll(file.Get(), text);
     }
-    // Room is reserved before the old text is touched, so that a full disk leaves it whole. A file
-    // system that cannot reserve is written to all the same.
-    const auto size = static_cast<off_t>(text.size());
-    if (size > 0 && ::fallocate(file.Get(), FALLOC_FL_KEEP_SIZE, 0, size) != 0 &&
-        (errno == ENOSPC || errno == EDQUOT)) {
+    std::string old;
+    if (!ReadFile(old, path, std::numeric_limits<std::size_t>::max())) {
         return false;
     }
-    return WriteAll(file.Get(), text) && ::ftruncate(file.Get(), size) == 0 &&
-           ::fsync(file.Get()) == 0;
-}
-
-// The answers of a directory (or of a mount point) that lets its files be written, not replaced.
-bool IsReplacementRefused(int error) {
-    return error == EACCES || error == EPERM || error == EROFS || error == EBUSY;
+    if (ReserveRoom(file.Get(), static_cast<off_t>(text.size())) && Overwrite(file.Get(), text)) {
+        return true;
+    }
+    const int failure = errno;
+    if (!exists) {
+        RemoveMadeFile(path);
+    } else if (::lseek(file.Get(), 0, SEEK_SET) == 0) {
+        (void)Overwrite(file.Get(), old); // its blocks are still there
+    }
+    errno = failure;
+    return false;
 }
 
 } // namespace
@@ -148,6 +198,9 @@ bool ReadFile(std::string &text, const std::string &path, std::size_t maxBytes) 
 bool WriteFile(const std::string &path, std::string_view text) {
     struct stat old {};
     const bool exists = ::lstat(path.c_str(), &old) == 0;
+    if (!exists && errno != ENOENT) {
+        return false;
+    }
     if (exists && !S_ISREG(old.st_mode)) {
         return RewriteInPlace(path, text);
     }

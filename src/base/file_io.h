@@ -19,9 +19,9 @@ namespace VANO::FILEINDEX {
 // given the old file's owner and mode and renamed over it, then the directory is flushed. A reader
 // sees the old text or the new one; a full disk or a killed process leaves the old one. Where a
 // file cannot be replaced (it is no regular file, its directory refuses new files, it is a mount
-// point) it is rewritten in place.
+// point, its owner cannot be given) it is rewritten in place, and put back when that fails.
 //
-// On failure returns false with errno set and no temporary file left behind.
+// On failure returns false with errno set, the old text standing and no other file left behind.
 [[nodiscard]] bool WriteFile(const std::string &path, std::string_view text);
 
 } // namespace VANO::FILEINDEX

@@ -33,8 +33,9 @@ const Json::StreamWriterBuilder &WriterSettings() {
     return settings;
 }
 
-// The JSON library lets three things pass whatever its settings say: comments inside an object or
-// array, a comma after a last member with an empty name, and everything behind a zero byte.
+// Whatever its settings say, the JSON library lets comments inside an object or array pass, a comma
+// after a last member with an empty name, and everything behind a zero byte. (Its lax numbers and
+// raw control characters in strings stay: they take nothing away from what the text means.)
 bool HasLibraryExtension(std::string_view text) {
     bool inString = false;
     bool afterComma = false;

@@ -1,6 +1,7 @@
 #ifndef FILEINDEX_BASE_JSON_IO_H
 #define FILEINDEX_BASE_JSON_IO_H
 
+#include <cstddef>
 #include <json/value.h>
 #include <memory>
 #include <string>
@@ -13,13 +14,12 @@ class CharReader;
 namespace VANO::FILEINDEX {
 
 // The largest text that is read from or written to a settings file. Far beyond any real one; it
-// keeps a file that grew by accident from taking the caller's memory. What can be written can be
-// read back.
+// keeps a file that grew by accident from taking the caller's memory. Nothing larger is written.
 constexpr std::size_t kMaxJsonFileBytes = std::size_t{64} * 1024 * 1024;
 
-// Reads JSON texts, one after another. A text is exactly one value of any type, with white space
-// around it and nothing else: no comments, no trailing commas. Nesting beyond the JSON library's
-// limit makes a text invalid too. Nothing throws.
+// Reads JSON texts, one after another. A text is exactly one value of any type, by the rules of the
+// JSON library, with white space around it and nothing else: no comments, no trailing commas.
+// Nesting beyond the JSON library's limit makes a text invalid too. Nothing throws.
 class JsonParser {
   public:
     JsonParser();

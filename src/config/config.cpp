@@ -1,7 +1,6 @@
 #include <fileindex/config.h>
 
 #include <cerrno>
-#include <cstdlib>
 #include <fcntl.h>
 #include <fileindex/error_handler.h>
 #include <sys/file.h>

@@ -24,9 +24,10 @@ bool Folder::Load(const std::string &newPath, const Json::Value &obj) {
 }
 
 bool Folder::Reload(const std::string &newPath, const Json::Value &obj) {
-    name.clear();
-    document = audio = video = photo = false;
-    return Load(newPath, obj);
+    Folder fresh;
+    const bool resolved = fresh.Load(newPath, obj);
+    *this = std::move(fresh);
+    return resolved;
 }
 
 bool Folder::SetPath(const std::string &newPath) {

@@ -81,13 +81,14 @@ bool Folders::Get(Json::Value &out, const std::string &path) {
 }
 
 bool Folders::List(std::vector<Folder> &out, const std::string &share) {
-    out.clear();
+    std::vector<Folder> listed;
     for (const auto &[path, folder] : folders) {
         std::string shareOfFolder;
         if (share.empty() || (GetShareNameByPath(shareOfFolder, path) && shareOfFolder == share)) {
-            out.push_back(folder);
+            listed.push_back(folder);
         }
     }
+    out.swap(listed);
     return true;
 }
 

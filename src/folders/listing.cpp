@@ -68,11 +68,12 @@ bool Folder::GetAdditional(Json::Value &out, const std::string &key) const {
 }
 
 bool Folder::GetAdditional(Json::Value &out, const Json::Value &keys) const {
+    const Json::Value wanted = keys; // may be what `out` holds
     out = Json::Value(Json::objectValue);
-    if (!keys.isArray()) {
-        return RefuseKeys(97, keys);
+    if (!wanted.isArray()) {
+        return RefuseKeys(97, wanted);
     }
-    for (const Json::Value &element : keys) {
+    for (const Json::Value &element : wanted) {
         if (!element.isString()) {
             return RefuseKeys(104, element);
         }
@@ -98,9 +99,9 @@ bool Folders::List(Json::Value &out, unsigned long offset, unsigned long limit,
     std::vector<Folder> sorted;
     (void)List(sorted);
     const unsigned long total = sorted.size();
-    out = Json::Value(Json::objectValue);
-    out["total"] = Json::UInt64{total};
-    out["offset"] = Json::UInt64{offset};
+    Json::Value listing(Json::objectValue); // `additional` may be what `out` holds
+    listing["total"] = Json::UInt64{total};
+    listing["offset"] = Json::UInt64{offset};
     Sort(sorted, sort_by);
     Json::Value page(Json::arrayValue);
     if (sort_direction == "DESC") {
@@ -117,7 +118,8 @@ bool Folders::List(Json::Value &out, unsigned long offset, unsigned long limit,
             page.append(sorted[index].asJson(additional));
         }
     }
-    out["folder"] = std::move(page);
+    listing["folder"] = std::move(page);
+    out.swap(listing);
     return true;
 }
 

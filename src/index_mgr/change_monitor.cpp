@@ -17,20 +17,11 @@ constexpr auto kQueueType = static_cast<VANOTIFYD::_tag_monitor_queue_type_>(1);
 // inotify's event bits from 0x2 to 0x8000 without "closed unwritten" (0x10) and "opened" (0x20).
 constexpr int kWatchedEvents = 0xffce;
 
-// False, with one line logged, for an unknown share.
-bool GetQueueLocation(std::string &queue, const std::string &share) {
-    if (!GetLocation(queue, FILEIDXQueuePathGet, share)) {
-        LogError(kIndexMgrUnit, __LINE__, "FILEIDXQueuePathGet failed, share=%s", share.c_str());
-        return false;
-    }
-    return true;
-}
-
 } // namespace
 
 bool IndexMgr::UpsertVANotifydCfg(const std::string &share) {
     std::string queue;
-    if (!GetQueueLocation(queue, share)) {
+    if (!GetQueueLocation(queue, share, kIndexMgrUnit, __LINE__)) {
         return false;
     }
     Folders settings;
@@ -64,7 +55,7 @@ bool IndexMgr::UpsertVANotifydCfg(const std::string &share) {
 
 bool IndexMgr::DeleteVANotifydCfg(const std::string &share) {
     std::string queue;
-    if (!GetQueueLocation(queue, share)) {
+    if (!GetQueueLocation(queue, share, kIndexMgrUnit, __LINE__)) {
         return false;
     }
     if (!VANOTIFYD::MonitorQueue::Delete(queue, kConsumer, kQueueType)) {

@@ -25,13 +25,9 @@ bool RefuseParameter(int line, const char *complaint, const std::string &text) {
     return false;
 }
 
-// The "path" of a request's element; empty where there is none that reads as a text.
+// The path of a request's element that was accepted: there it is a string.
 std::string PathOf(const Json::Value &element) {
-    if (!element.isObject()) {
-        return {};
-    }
-    const Json::Value path = element.get("path", "");
-    return path.isConvertibleTo(Json::stringValue) ? path.asString() : std::string();
+    return element["path"].asString();
 }
 
 bool ResolvePath(std::string &fullPath, const std::string &path) {
@@ -78,12 +74,12 @@ struct Touched {
 bool ApplyUpserts(Touched &touched, Folders &settings, const Json::Value &request) {
     Json::Value report;
     for (const Json::Value &element : request) {
-        const std::string path = PathOf(element);
         if (!settings.Upsert(report, element)) {
             LogError(kIndexMgrUnit, __LINE__, "Upsert failed, folder=%s",
                      JsonToMessageText(element).c_str());
             return false;
         }
+        const std::string path = PathOf(element);
         touched.reports[path] = report;
         if (!AddShareOf(touched.shares, path)) {
             return false;
@@ -182,8 +178,10 @@ bool SettleShares(const std::set<std::string> &shares) {
 
 // --- Reindex, step by step ----------------------------------------------------------------------
 
-// Checks every path before anything is done. `fullShares` receives the shares out of space.
+// Checks every path before anything is done. `fullShares` receives the shares out of space. Each
+// share is asked about once: every question reads a settings file.
 bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
+    std::set<std::string> checked;
     for (const Json::Value &element : paths) {
         if (!element.isString()) {
             return RefuseParameter(__LINE__, "Malformed jsArrPath", JsonToMessageText(element));
@@ -194,6 +192,9 @@ bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
             LogError(kIndexMgrUnit, __LINE__, "Failed to get share name from path: %s",
                      path.c_str());
             return false;
+        }
+        if (!checked.insert(share).second) {
+            continue;
         }
         if (!IndexMgr::IsShareIndexed(share)) {
             return false;

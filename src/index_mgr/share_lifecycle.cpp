@@ -93,15 +93,13 @@ bool IndexMgr::ShareResume(const std::string &share) {
 
 bool IndexMgr::CleanShareIndexData(const std::string &share) {
     std::string queue;
-    if (!GetLocation(queue, FILEIDXQueuePathGet, share)) {
-        LogError(kIndexMgrUnit, __LINE__, "FILEIDXQueuePathGet failed, share=%s", share.c_str());
+    if (!GetQueueLocation(queue, share, kIndexMgrUnit, __LINE__)) {
         return false;
     }
     RemoveRecursively(queue);
     RemoveRecursively(queue + kTakenQueueSuffix);
     std::string database;
-    if (!GetLocation(database, FILEIDXDBPathGet, share)) {
-        LogError(kIndexMgrUnit, __LINE__, "FILEIDXDBPathGet failed, share=%s", share.c_str());
+    if (!GetDatabaseLocation(database, share, kIndexMgrUnit, __LINE__)) {
         return false;
     }
     RemoveRecursively(database);

@@ -8,6 +8,7 @@
 
 #include "base/log.h"
 #include "config/paths.h"
+#include "status/resume_time.h"
 #include "utils/contains.h"
 #include "utils/event_codes.h"
 #include "utils/queue_reader.h"
@@ -22,7 +23,6 @@ constexpr char kFinished[] = "finished";
 constexpr char kProcessing[] = "processing";
 constexpr char kPaused[] = "paused";
 constexpr char kNoSpace[] = "err_no_space";
-constexpr long long kNotPaused = -1;
 
 // Whether the queue file holds an event at or under the folder. Reads the whole file, so that each
 // malformed line in it is logged.
@@ -60,17 +60,9 @@ bool IsPathInQueue(const std::string &path, const std::string &queueFile) {
 }
 
 const char *WaitingStatus(long long resumeTime) {
-    return resumeTime != 0 && resumeTime <= static_cast<long long>(::time(nullptr)) ? kProcessing
-                                                                                    : kPaused;
-}
-
-// False, with one line logged, when the share is unknown.
-bool GetQueueLocation(std::string &queue, const std::string &share, int line) {
-    if (!GetLocation(queue, FILEIDXQueuePathGet, share)) {
-        LogError(kUnit, line, "FILEIDXQueuePathGet failed, share=%s", share.c_str());
-        return false;
-    }
-    return true;
+    return resumeTime != kPausedWithoutEnd && resumeTime <= static_cast<long long>(::time(nullptr))
+               ? kProcessing
+               : kPaused;
 }
 
 // The shares of the folders that can be indexed. False, with one line logged, when a share cannot
@@ -104,7 +96,7 @@ std::string StatusMgr::GetFolderStatus(const std::string &path) {
         return kNoSpace;
     }
     std::string queue;
-    if (!GetQueueLocation(queue, share, 100)) {
+    if (!GetQueueLocation(queue, share, kUnit, 100)) {
         return kFinished;
     }
     long long resumeTime = kNotPaused;
@@ -124,7 +116,7 @@ bool StatusMgr::GetStatus(std::string &status) {
     bool waiting = false;
     for (const std::string &share : shares) {
         std::string queue;
-        if (!GetQueueLocation(queue, share, 146)) {
+        if (!GetQueueLocation(queue, share, kUnit, 146)) {
             return false;
         }
         if (IsFileExist(queue) || IsFileExist(queue + kTakenQueueSuffix)) {

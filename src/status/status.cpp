@@ -4,6 +4,7 @@
 
 #include "base/log.h"
 #include "config/paths.h"
+#include "status/resume_time.h"
 
 namespace VANO::FILEINDEX {
 
@@ -13,7 +14,6 @@ constexpr char kUnit[] = "status";
 constexpr char kResumeTime[] = "resume_time";
 constexpr char kNoSpace[] = "no_space";
 constexpr char kNeedReindex[] = "need_reindex";
-constexpr Json::Int64 kNotPaused = -1;
 
 bool IsShareMarked(const Json::Value &root, const char *kind, const std::string &share) {
     return root.isObject() && root.isMember(kind) && root[kind].isObject() &&
@@ -52,13 +52,13 @@ bool Status::Pause(long long resume_time) {
 }
 
 bool Status::Resume() {
-    root[kResumeTime] = kNotPaused;
+    root[kResumeTime] = static_cast<Json::Int64>(kNotPaused);
     return true;
 }
 
 bool Status::GetPauseInfo(long long &resume_time) {
     try {
-        resume_time = root.get(kResumeTime, kNotPaused).asInt64();
+        resume_time = root.get(kResumeTime, static_cast<Json::Int64>(kNotPaused)).asInt64();
         return true;
     } catch (const Json::Exception &) {
         LogError(kUnit, 66, "json exception");

@@ -8,6 +8,7 @@
 
 #include "base/log.h"
 #include "config/settings_lock.h"
+#include "status/resume_time.h"
 
 namespace VANO::FILEINDEX {
 
@@ -48,7 +49,7 @@ bool TellDaemon(const char *command, const Json::Value &parameters, int line) {
 // service always have.
 long long EndOfPause(int hours) {
     if (hours == 0) {
-        return 0;
+        return kPausedWithoutEnd;
     }
     const auto now = static_cast<std::uint32_t>(::time(nullptr));
     return static_cast<std::int32_t>(now + static_cast<std::uint32_t>(hours) * kSecondsPerHour);

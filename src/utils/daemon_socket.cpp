@@ -23,7 +23,7 @@ constexpr int kWriteRetries = 3;
 constexpr timeval kSendTimeout = {1, 0};
 
 // Writes one piece. A write of nothing that was interrupted is repeated, out of one budget for the
-// whole message; 0 means that the budget or the peer gave out.
+// whole buffer; 0 means that the budget or the peer gave out.
 std::int64_t WritePiece(int fd, const char *piece, std::int64_t length, int &retries) {
     ssize_t written = ::write(fd, piece, static_cast<std::size_t>(length));
     while (written == 0 && errno == EINTR && retries > 0) {
@@ -55,16 +55,25 @@ bool WriteAll(int fd, std::size_t length, const void *buffer) {
     return true;
 }
 
+bool SetSendTimeout(const UniqueFd &connection) {
+    return ::setsockopt(connection.Get(), SOL_SOCKET, SO_SNDTIMEO, &kSendTimeout,
+                        sizeof(kSendTimeout)) == 0;
+}
+
 UniqueFd ConnectToDaemon() {
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
     std::memcpy(address.sun_path, kDaemonSocketPath, sizeof(kDaemonSocketPath));
     UniqueFd connection(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
-    if (!connection ||
-        ::connect(connection.Get(), reinterpret_cast<const sockaddr *>(&address),
+    if (!connection) {
+        return connection;
+    }
+    // Already for the connection: a daemon that accepts no more must not hold up the caller, who
+    // may hold a lock.
+    (void)SetSendTimeout(connection);
+    if (::connect(connection.Get(), reinterpret_cast<const sockaddr *>(&address),
                   sizeof(address)) != 0 ||
-        ::setsockopt(connection.Get(), SOL_SOCKET, SO_SNDTIMEO, &kSendTimeout,
-                     sizeof(kSendTimeout)) != 0) {
+        !SetSendTimeout(connection)) {
         return UniqueFd();
     }
     return connection;

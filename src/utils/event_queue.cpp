@@ -1,7 +1,6 @@
 #include <fileindex/event_queue.h>
 
 #include <cerrno>
-#include <cstdlib>
 #include <fcntl.h>
 #include <fileindex/config.h>
 #include <fileindex/share_path.h>
@@ -60,9 +59,9 @@ bool IsPathReindexQueued(const std::string &fullPath, const std::string &queueFi
 
 // Users can write beside the queue: nothing but a regular file of that very name is appended to.
 UniqueFd OpenQueue(const std::string &queueFile) {
-    UniqueFd queue(::open(queueFile.c_str(),
-                          O_WRONLY | O_APPEND | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC,
-                          0666));
+    UniqueFd queue(::open(
+        queueFile.c_str(),
+        O_WRONLY | O_APPEND | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC, 0666));
     struct stat info {};
     if (!queue || ::fstat(queue.Get(), &info) != 0 || !S_ISREG(info.st_mode)) {
         return UniqueFd();
@@ -72,11 +71,11 @@ UniqueFd OpenQueue(const std::string &queueFile) {
 
 // Between opening the queue and locking it the daemon may have taken it over: what is written to
 // that file then is lost.
-bool IsStillTheQueue(const UniqueFd &queue, const std::string &queueFile) {
+bool IsTakenOver(const UniqueFd &queue, const std::string &queueFile) {
     struct stat opened {};
     struct stat named {};
-    return ::fstat(queue.Get(), &opened) == 0 && ::lstat(queueFile.c_str(), &named) == 0 &&
-           opened.st_dev == named.st_dev && opened.st_ino == named.st_ino;
+    return ::fstat(queue.Get(), &opened) != 0 || ::lstat(queueFile.c_str(), &named) != 0 ||
+           opened.st_dev != named.st_dev || opened.st_ino != named.st_ino;
 }
 
 void WriteAndUnlock(const UniqueFd &queue, const std::string &line) {
@@ -88,7 +87,7 @@ void WriteAndUnlock(const UniqueFd &queue, const std::string &line) {
     (void)::flock(queue.Get(), LOCK_UN);
 }
 
-enum class Append { kDone, kBusy, kFailed };
+enum class Append { kDone, kBusy, kTakenOver, kFailed };
 
 Append TryToAppend(const std::string &queueFile, const std::string &line) {
     const UniqueFd queue = OpenQueue(queueFile);
@@ -105,9 +104,8 @@ Append TryToAppend(const std::string &queueFile, const std::string &line) {
         }
         return Append::kFailed;
     }
-    if (!IsStillTheQueue(queue, queueFile)) {
-        errno = EAGAIN;
-        return Append::kBusy;
+    if (IsTakenOver(queue, queueFile)) {
+        return Append::kTakenOver;
     }
     WriteAndUnlock(queue, line);
     return Append::kDone;
@@ -116,14 +114,20 @@ Append TryToAppend(const std::string &queueFile, const std::string &line) {
 // False when the queue cannot be opened or locked at all. One that only stays busy drops the line,
 // which counts as done.
 bool AppendLine(const std::string &queueFile, const std::string &line) {
+    Append result = Append::kFailed;
     for (int attempt = 0; attempt < kLockAttempts; ++attempt) {
-        const Append result = TryToAppend(queueFile, line);
-        if (result != Append::kBusy) {
+        result = TryToAppend(queueFile, line);
+        if (result == Append::kDone || result == Append::kFailed) {
             return result == Append::kDone;
         }
-        const int busy = errno;
-        PauseBeforeNextLockAttempt();
-        errno = busy;
+        if (result == Append::kBusy) {
+            const int busy = errno;
+            PauseBeforeNextLockAttempt();
+            errno = busy;
+        }
+    }
+    if (result == Append::kTakenOver) {
+        return false;
     }
     if (IsVerbose()) {
         LogError(kUnit, 516, "try lock too many times, path=%s, reason=%s", queueFile.c_str(),
@@ -151,8 +155,7 @@ bool QueueEventOnce(std::string &shareName, int event, const std::string &fullPa
     }
     shareName = found.name.data();
     std::string queueFile;
-    if (!GetLocation(queueFile, FILEIDXQueuePathGet, shareName)) {
-        LogError(kUnit, 478, "FILEIDXQueuePathGet failed, share=%s", shareName.c_str());
+    if (!GetQueueLocation(queueFile, shareName, kUnit, 478)) {
         return false;
     }
     if (IsPathReindexQueued(fullPath, queueFile) ||

@@ -1,14 +1,31 @@
 #include "utils/queue_reader.h"
 
+#include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <fcntl.h>
+#include <string_view>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace VANO::FILEINDEX {
 
+namespace {
+
+// Far beyond any event. What is longer comes from a file that is no queue, and is cut.
+constexpr std::size_t kMaxLineBytes = kMaxJsonFileBytes;
+// Ends a line that was cut: no JSON object ends so.
+constexpr char kCutMark[] = "...";
+
+} // namespace
+
 QueueReader::QueueReader(const std::string &path)
-    : file_(::open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC)) {}
+    : file_(::open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC)) {
+    struct stat info {};
+    if (file_ && (::fstat(file_.Get(), &info) != 0 || !S_ISREG(info.st_mode))) {
+        file_ = UniqueFd();
+        errno = EINVAL;
+    }
+}
 
 bool QueueReader::Fill() {
     ssize_t got = 0;
@@ -22,38 +39,38 @@ bool QueueReader::Fill() {
 
 bool QueueReader::NextLine(std::string &line) {
     line.clear();
-    for (;;) {
-        if (begin_ == end_ && !Fill()) {
-            return !line.empty();
-        }
-        const char *const start = buffer_.data() + begin_;
-        const std::size_t available = end_ - begin_;
-        const void *const newline = std::memchr(start, '\n', available);
-        if (newline != nullptr) {
-            const auto length =
-                static_cast<std::size_t>(static_cast<const char *>(newline) - start);
-            line.append(start, length);
-            begin_ += length + 1;
-            return true;
-        }
-        line.append(start, available);
-        begin_ = end_;
+    bool cut = false;
+    bool ended = false;
+    while (!ended && (begin_ != end_ || Fill())) {
+        const std::string_view rest(buffer_.data() + begin_, end_ - begin_);
+        const std::size_t length = std::min(rest.find('\n'), rest.size());
+        const std::size_t room = kMaxLineBytes - line.size();
+        line.append(rest.substr(0, std::min(length, room)));
+        cut = cut || length > room;
+        ended = length < rest.size();
+        begin_ += length + (ended ? 1 : 0);
     }
+    if (cut) {
+        line.append(kCutMark);
+    }
+    return ended || !line.empty();
 }
 
 bool QueueReader::ParseEvent(QueueEvent &event, const std::string &line) {
     if (!parser_.Parse(parsed_, line) || !parsed_.isObject()) {
         return false;
     }
-    if (!parsed_.isMember("event") || !parsed_["event"].isConvertibleTo(Json::uintValue) ||
-        !parsed_["path"].isString()) {
+    const Json::Value &object = parsed_;
+    const Json::Value &path = object["path"];
+    const Json::Value &formerPath = object["path_old"];
+    if (!object.isMember("event") || !object["event"].isConvertibleTo(Json::uintValue) ||
+        !path.isString()) {
         return false;
     }
-    event.code = parsed_["event"].asUInt();
-    event.path = parsed_["path"].asString();
-    const Json::Value &former = parsed_["path_old"];
+    event.code = object["event"].asUInt();
+    event.path = path.asString();
     event.formerPath =
-        former.isConvertibleTo(Json::stringValue) ? former.asString() : std::string();
+        formerPath.isConvertibleTo(Json::stringValue) ? formerPath.asString() : std::string();
     return true;
 }
 

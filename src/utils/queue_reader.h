@@ -18,10 +18,11 @@ struct QueueEvent {
     std::string formerPath; // "path_old" of a moved item; empty when absent or no text
 };
 
-// Reads a queue file line by line. Memory grows with the longest line alone, not with the file.
+// Reads a queue file line by line. Memory grows with the longest line alone, not with the file, and
+// ends at 64 MiB: a longer line is cut there and is then no event.
 class QueueReader {
   public:
-    // Opens the queue; a symbolic link in its place is not followed. Reading never blocks.
+    // Opens the queue, a regular file; a symbolic link in its place is not followed.
     explicit QueueReader(const std::string &path);
 
     // Whether the queue could be opened; errno says why not.
@@ -37,9 +38,9 @@ class QueueReader {
   private:
     [[nodiscard]] bool Fill();
 
-    UniqueFd file_;
     JsonParser parser_;
     Json::Value parsed_;
+    UniqueFd file_; // opened last, for errno
     std::array<char, std::size_t{64} * 1024> buffer_;
     std::size_t begin_ = 0;
     std::size_t end_ = 0;

@@ -1,22 +1,17 @@
 #ifndef FILEINDEX_UTILS_SHARE_LOCATION_H
 #define FILEINDEX_UTILS_SHARE_LOCATION_H
 
-#include <fileindex/fileindex.h>
 #include <string>
 
 namespace VANO::FILEINDEX {
 
-using LocationGet = int (*)(const char *, char *, int);
-
-// FILEIDXQueuePathGet() or FILEIDXDBPathGet() into a string. False for an unknown share.
-inline bool GetLocation(std::string &location, LocationGet get, const std::string &share) {
-    char buffer[4096] = {};
-    if (get(share.c_str(), buffer, sizeof(buffer)) < 0) {
-        return false;
-    }
-    location = buffer;
-    return true;
-}
+// Where a share's event queue file or index database lies, as FILEIDXQueuePathGet() and
+// FILEIDXDBPathGet() say. False, with "<function> failed, share=%s" logged for the unit and line,
+// when the share is unknown or the path too long.
+[[nodiscard]] bool GetQueueLocation(std::string &location, const std::string &share,
+                                    const char *unit, int line);
+[[nodiscard]] bool GetDatabaseLocation(std::string &location, const std::string &share,
+                                       const char *unit, int line);
 
 } // namespace VANO::FILEINDEX
 

@@ -1,7 +1,5 @@
 #include <fileindex/share_path.h>
 
-#include <array>
-#include <climits>
 #include <cstring>
 #include <fileindex/error_handler.h>
 #include <sys/stat.h>

@@ -22,8 +22,9 @@ inline ShareRecord FindShare(const char *name) {
     return result < 0 ? nullptr : ShareRecord(share);
 }
 
+// A name with a zero byte is no share's: the platform would take it for a shorter one.
 inline ShareRecord FindShare(const std::string &name) {
-    return FindShare(name.c_str());
+    return name.find('\0') == std::string::npos ? FindShare(name.c_str()) : nullptr;
 }
 
 } // namespace VANO::FILEINDEX

@@ -18,8 +18,8 @@ int VANOEAIsHiddenDir(const char *name) {
     return name != nullptr && std::strcmp(name, kMetadataDirectory) == 0 ? 1 : 0;
 }
 
-// No flags are defined; they are not looked at. Users can write to a share's top: a symbolic link
-// that stands in the directory's place is refused, so that nothing is written behind it.
+// No flags are defined; they are not looked at. A symbolic link that stands in the directory's
+// place is a failure: users can write to a share's top.
 int VANOEAMKDir(int /*flags*/, const char *path) {
     if (path == nullptr || *path == '\0') {
         return PLATFORM_FAIL(kErrBadParameter);

@@ -13,7 +13,7 @@ namespace VANO::PLATFORM {
 
 namespace {
 
-constexpr std::size_t kMaxMountInfoBytes = 16U * 1024 * 1024;
+constexpr std::size_t kMaxMountInfoBytes = std::size_t{16} * 1024 * 1024;
 
 // The kernel writes white space and backslashes in this table as three octal digits.
 std::string Unescape(const std::string &text) {

@@ -160,7 +160,7 @@ void CloseAllBut(std::array<int, 2> kept) {
 // is unsafe after the fork of a process with threads.
 [[noreturn]] void Supervise(const SpawnPlan &plan, const char *path, const char *const *argv,
                             bool wait, int resultFd, int outputFd) {
-    ::signal(SIGCHLD, SIG_DFL);
+    (void)::signal(SIGCHLD, SIG_DFL);
     CloseAllBut({resultFd, outputFd}); // the caller's locks hang on its descriptors
     const RunResult result = SpawnAndWait(plan, path, argv, wait);
     const ssize_t written = ::write(resultFd, &result, sizeof result);
@@ -284,6 +284,7 @@ int VLIBCExec(const char *path, ...) {
     const int result = NoThrow(-1, [&] {
         std::vector<const char *> argv{path};
         do {
+            // NOLINTNEXTLINE(clang-analyzer-valist.Uninitialized): started before the lambda
             argv.push_back(va_arg(arguments, const char *));
         } while (argv.back() != nullptr);
         return RecordResult(Run(path, argv.data(), true));

@@ -26,7 +26,7 @@ RunResult Run(const char *path, const char *const *argv, bool wait);
 RunResult Run(const char *path, std::initializer_list<const char *> arguments);
 
 // The same, with what it wrote to standard output, of which at most `kMaxOutputBytes` are kept.
-constexpr std::size_t kMaxOutputBytes = 64U * 1024;
+constexpr std::size_t kMaxOutputBytes = std::size_t{64} * 1024;
 RunResult RunForOutput(std::string &output, const char *path,
                        std::initializer_list<const char *> arguments);
 

@@ -21,7 +21,7 @@ enum class Answer { kYes, kNo, kUnknown };
 
 // The effective user's quota on the file system that holds `fd`; as quotactl_fd().
 long AskQuota(int fd, struct if_dqblk *quota) {
-    const unsigned command = static_cast<unsigned>(QCMD(Q_GETQUOTA, USRQUOTA));
+    const auto command = static_cast<unsigned>(QCMD(Q_GETQUOTA, USRQUOTA));
     const uid_t user = ::geteuid();
     const long result = ::syscall(SYS_quotactl_fd, fd, command, user, quota);
     if (result == 0 || errno != ENOSYS) {

@@ -24,16 +24,14 @@ bool IsServiceName(const char *name) {
            name[std::strspn(name, kAllowed)] == '\0';
 }
 
-bool IsRegularFile(const std::string &path) {
-    struct stat info {};
-    return ::stat(path.c_str(), &info) == 0 && S_ISREG(info.st_mode);
-}
-
-// A masked unit, a link to the null device, counts as none.
+// The first directory that has the unit decides. A masked unit, a link to the null device, counts
+// as none and hides those behind it.
 bool HasUnit(const std::string &name) {
+    struct stat info {};
     for (const char *directory : kUnitDirectories) {
-        if (IsRegularFile(std::string(directory) + "/" + name + ".service")) {
-            return true;
+        const std::string path = std::string(directory) + "/" + name + ".service";
+        if (::stat(path.c_str(), &info) == 0) {
+            return S_ISREG(info.st_mode);
         }
     }
     return false;
@@ -79,8 +77,9 @@ class ServiceControl {
     }
 
     [[nodiscard]] bool Do(const char *action) const {
-        const RunResult result = systemd_ ? Run(kSystemctl, {action, name_.c_str()})
-                                          : Run(kService, {name_.c_str(), action});
+        const RunResult result = systemd_
+                                     ? Run(kSystemctl, {"--no-ask-password", action, name_.c_str()})
+                                     : Run(kService, {name_.c_str(), action});
         return result == RunResult::kSuccess;
     }
 
