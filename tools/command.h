@@ -1,0 +1,43 @@
+#ifndef FILEINDEXCTL_COMMAND_H
+#define FILEINDEXCTL_COMMAND_H
+
+#include <CLI/CLI.hpp>
+#include <functional>
+#include <vector>
+
+namespace CTL {
+
+// What the tool tells its caller.
+enum ExitCode : int {
+    kDone = 0,
+    kFailed = 1,   // it could not be done
+    kUsage = 2,    // a mistake in the call; nothing was done
+    kNotFound = 3, // not indexed, or nothing of that name; nothing was done
+};
+
+using Action = std::function<ExitCode()>;
+
+// A subcommand: `declare` adds its arguments to `app` and returns what it does once they are read.
+struct Command {
+    const char *name;
+    const char *summary;
+    Action (*declare)(CLI::App &app);
+};
+
+// Makes the table's commands subcommands of `app`, one of which must be chosen; the result runs it.
+Action DeclareCommands(CLI::App &app, const std::vector<Command> &table);
+
+// One file each, cmd_<name>.cpp.
+Action DeclareAdd(CLI::App &app);
+Action DeclareGet(CLI::App &app);
+Action DeclareList(CLI::App &app);
+Action DeclarePause(CLI::App &app);
+Action DeclareQuery(CLI::App &app);
+Action DeclareReindex(CLI::App &app);
+Action DeclareRemove(CLI::App &app);
+Action DeclareResume(CLI::App &app);
+Action DeclareShare(CLI::App &app);
+
+} // namespace CTL
+
+#endif

@@ -1,0 +1,22 @@
+#ifndef FILEINDEXCTL_TEXT_H
+#define FILEINDEXCTL_TEXT_H
+
+#include <cstddef>
+#include <string>
+
+namespace CTL {
+
+// Text from elsewhere, fit for one line of a terminal: control characters, line breaks of any kind,
+// characters that change the writing direction, bytes that are not UTF-8, and the backslash itself
+// are shown as escapes (\n, \x1b, \u202e, \\).
+[[nodiscard]] std::string Shown(const std::string &text);
+
+// How many columns a terminal needs for text that Shown() has returned.
+[[nodiscard]] std::size_t Columns(const std::string &shown);
+
+// `shown` with spaces after it, so that it takes at least that many columns.
+[[nodiscard]] std::string Padded(const std::string &shown, std::size_t columns);
+
+} // namespace CTL
+
+#endif
