@@ -1,0 +1,720 @@
+#include <fileindex/folders.h>
+#include <fileindex/index_mgr.h>
+
+#include <memory>
+#include <stdexcept>
+
+#include "index_mgr/index_mgr_fixture.h"
+
+namespace VANO::TESTS {
+
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::ElementsAreArray;
+using ::testing::IsEmpty;
+using namespace std::string_literals;
+
+const std::string kUpsert = "upsert_folder_setting";
+
+std::string Told(const std::string &path) {
+    return TESTS::Told(kUpsert, "folder_path", path);
+}
+
+// Two new folders, the shares against the order of the array.
+Json::Value TwoFolders() {
+    return Json(R"([{"path":"/video/b","video":true},{"path":"/photos/a","photo":true}])");
+}
+
+// What a successful Upsert of TwoFolders() does.
+std::vector<std::string> AllSteps() {
+    return {Changed(kFolderFile),
+            Watched(kPhotos, {"/volume1/photos/a"}),
+            Watched(kVideo, {"/volume1/video/b"}),
+            kStarted,
+            kSpotlightOn,
+            kRestarted,
+            Told("/video/b"),
+            Told("/photos/a"),
+            Changed(QueueOf(kPhotos)),
+            Changed(QueueOf(kVideo))};
+}
+
+class UpsertTest : public IndexMgrTest {};
+
+TEST_F(UpsertTest, EveryPartyIsToldInOrderUnderTheLock) {
+    DaemonPeer daemon;
+    Watch();
+    Fault::Record(Call::Flock);
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    EXPECT_THAT(Effects(),
+                ElementsAre(Locked(kFolderLock), Changed(kFolderFile), Made(kPhotos),
+                            Watched(kPhotos, {"/volume1/photos/a"}), Made(kVideo),
+                            Watched(kVideo, {"/volume1/video/b"}), kStarted, kSpotlightOn,
+                            kRestarted, Told("/video/b"), Told("/photos/a"), Made(kPhotos),
+                            Locked(QueueOf(kPhotos)), Changed(QueueOf(kPhotos)),
+                            Unlocked(QueueOf(kPhotos)), Made(kVideo), Locked(QueueOf(kVideo)),
+                            Changed(QueueOf(kVideo)), Unlocked(QueueOf(kVideo)),
+                            Unlocked(kFolderLock)));
+    ExpectError(FILEINDEX_ERR_NONE);
+}
+
+TEST_F(UpsertTest, TheSettingsAreStoredAndTheChangesQueued) {
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    Json::Value stored(Json::objectValue);
+    stored["/photos/a"] = PhotoFolder("/photos/a");
+    stored["/video/b"] = PhotoFolder("/video/b");
+    stored["/video/b"]["photo"] = false;
+    stored["/video/b"]["video"] = true;
+    EXPECT_EQ(ReadJson(kFolderFile), stored);
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)),
+                ElementsAre(Event(kSettingEvent, "/volume1/photos/a", EverythingChanged())));
+    EXPECT_THAT(EventsIn(QueueOf(kVideo)),
+                ElementsAre(Event(kSettingEvent, "/volume1/video/b", EverythingChanged())));
+    EXPECT_FALSE(Exists(kStatusFile));
+}
+
+TEST_F(UpsertTest, AddAndSetAreUpsert) {
+    using Operation = bool (*)(const Json::Value &);
+    for (const Operation operation : {&IndexMgr::Add, &IndexMgr::Set}) {
+        SetUp();
+        const DaemonPeer daemon;
+        Watch();
+        EXPECT_TRUE(operation(TwoFolders()));
+        EXPECT_THAT(Steps(), ElementsAreArray(AllSteps()));
+        EXPECT_FALSE(operation(Json("{}")));
+        ExpectError(FILEINDEX_ERR_BAD_PARAM);
+        ExpectLog({"index_mgr:* Bad param: {}"});
+    }
+}
+
+TEST_F(UpsertTest, ARequestThatIsNoArrayIsRefusedBeforeAnything) {
+    PutFolders({"/photos/a"});
+    const DaemonPeer daemon;
+    Watch();
+    Fault::Count(Call::Flock);
+    for (const char *request : {R"({"path":"/photos/b"})", R"("/photos/b")", "{}", "null", "7",
+                                "true", "1.5", "\"\xff\""}) {
+        SCOPED_TRACE(request);
+        EXPECT_FALSE(IndexMgr::Upsert(Json(request)));
+        ExpectError(FILEINDEX_ERR_BAD_PARAM);
+        ExpectLog({"index_mgr:* Bad param: "s + request});
+    }
+    EXPECT_EQ(Fault::Calls(Call::Flock), 0U);
+    EXPECT_FALSE(Exists(kFolderLock));
+    EXPECT_THAT(Steps(), IsEmpty());
+}
+
+TEST_F(UpsertTest, AnEmptyRequestSavesAndStartsTheServicesOnly) {
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(Json("[]")));
+    EXPECT_THAT(Steps(), ElementsAre(Changed(kFolderFile), kStarted, kSpotlightOn, kRestarted));
+    EXPECT_EQ(ReadJson(kFolderFile), Json("{}"));
+}
+
+TEST_F(UpsertTest, AnEmptyRequestKeepsTheSettings) {
+    PutFolders({"/photos/a", "/gone/b"});
+    const Json::Value before = ReadJson(kFolderFile);
+    platform.spotlight = true;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(Json("[]")));
+    EXPECT_EQ(ReadJson(kFolderFile), before);
+    EXPECT_THAT(platform.monitorCalls, IsEmpty());
+    EXPECT_EQ(platform.Calls("VLIBServiceStart"), 1U);
+}
+
+TEST_F(UpsertTest, FieldsThatTheRequestLacksAreKept) {
+    PutFile(kFolderFile, R"({"/photos/a":{"name":"Mine","document":true,"photo":true}})");
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a","photo":false,"video":true}])")));
+    EXPECT_EQ(ReadJson(kFolderFile)["/photos/a"],
+              Json(R"({"path":"/photos/a","name":"Mine","document":true,"audio":false,
+                       "video":true,"photo":false})"));
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)), ElementsAre(Event(kSettingEvent, "/volume1/photos/a",
+                                                              Report(false, false, true, true))));
+}
+
+TEST_F(UpsertTest, ANewFolderIsComparedWithTheFolderThatGovernedIt) {
+    PutFolders({"/photos"});
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a","photo":true,"audio":true}])")));
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)), ElementsAre(Event(kSettingEvent, "/volume1/photos/a",
+                                                              Report(false, true, false, false))));
+}
+
+TEST_F(UpsertTest, OfAPathThatComesTwiceTheLastReportIsQueued) {
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a","photo":true},
+                                          {"path":"/video/b"},
+                                          {"path":"/photos/a","photo":true,"audio":true}])")));
+    EXPECT_THAT(Steps(),
+                ElementsAre(Changed(kFolderFile), Watched(kPhotos, {"/volume1/photos/a"}),
+                            Watched(kVideo, {"/volume1/video/b"}), kStarted, kSpotlightOn,
+                            kRestarted, Told("/photos/a"), Told("/video/b"), Told("/photos/a"),
+                            Changed(QueueOf(kPhotos)), Changed(QueueOf(kVideo))));
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)), ElementsAre(Event(kSettingEvent, "/volume1/photos/a",
+                                                              Report(false, true, false, false))));
+    // The other report is its own, nothing of the first element's is left in it.
+    EXPECT_THAT(EventsIn(QueueOf(kVideo)),
+                ElementsAre(Event(kSettingEvent, "/volume1/video/b", EverythingChanged())));
+}
+
+TEST_F(UpsertTest, SharesAndEventsGoInByteOrderAndCommandsInThatOfTheRequest) {
+    platform.AddShare("Zoo", "/volume1/Zoo");
+    PutFile(QueueOf("/volume1/Zoo"), "");
+    PutFolders({"/photos/c"});
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/photos/b"},{"path":"/Zoo/z"},
+                                          {"path":"/photos/B"}])")));
+    EXPECT_THAT(
+        Steps(),
+        ElementsAre(
+            Changed(kFolderFile), Watched("/volume1/Zoo", {"/volume1/Zoo/z"}),
+            Watched(kPhotos, {"/volume1/photos/B", "/volume1/photos/b", "/volume1/photos/c"}),
+            kStarted, kSpotlightOn, kRestarted, Told("/photos/b"), Told("/Zoo/z"),
+            Told("/photos/B"), Changed(QueueOf(kPhotos)), Changed(QueueOf(kPhotos))));
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)),
+                ElementsAre(Event(kSettingEvent, "/volume1/photos/B", EverythingChanged()),
+                            Event(kSettingEvent, "/volume1/photos/b", EverythingChanged())));
+}
+
+TEST_F(UpsertTest, APendingReindexOfTheFolderCoversTheChange) {
+    const std::string pending = R"({"event":65536,"path":"/volume1/photos/a","data":null})"
+                                "\n";
+    PutFile(QueueOf(kPhotos), pending);
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a"}])")));
+    EXPECT_EQ(ReadText(QueueOf(kPhotos)), pending);
+}
+
+TEST_F(UpsertTest, SpotlightThatIsOnIsLeftAlone) {
+    const DaemonPeer daemon;
+    for (const int on : {1, 2, -1}) {
+        SCOPED_TRACE(on);
+        platform.AnswerAlways("VANOSMBIsEnableSpotlight", on);
+        Watch();
+        EXPECT_TRUE(IndexMgr::Upsert(Json("[]")));
+        EXPECT_EQ(platform.Calls("VANOSMBSetSpotlight"), 0U);
+        EXPECT_EQ(platform.Calls("VLIBServiceRestart"), 0U);
+    }
+}
+
+TEST_F(UpsertTest, OnlyNegativeAnswersOfThePlatformAreFailures) {
+    platform.AnswerAlways("VLIBServiceStart", 1);
+    platform.AnswerAlways("VANOSMBSetSpotlight", 2);
+    platform.AnswerAlways("VLIBServiceRestart", 3);
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    EXPECT_THAT(Steps(), ElementsAreArray(AllSteps()));
+}
+
+TEST_F(UpsertTest, ASuccessLeavesTheLastErrorAsItWas) {
+    const DaemonPeer daemon;
+    ErrorHandler::SetError(FILEINDEX_ERR_FOLDER_LIMIT);
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    ExpectError(FILEINDEX_ERR_FOLDER_LIMIT);
+}
+
+TEST_F(UpsertTest, StoredSettingsOfAnyShapeStayInTheFile) {
+    PutFile(kFolderFile, R"({"/photos/a":7,"/gone/x":[1],"":{"photo":true}})");
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/video/b"}])")));
+    EXPECT_THAT(StoredPaths(), ElementsAre("", "/gone/x", "/photos/a", "/video/b"));
+    EXPECT_EQ(ReadJson(kFolderFile)[""], PhotoFolder(""));
+    const std::string noShare = "utils:389 GetShareNameByPath failed, path=";
+    ExpectLog({noShare, // loading
+               noShare, "folder:16 Failed to get full path from ",
+               "folder:16 Failed to get full path from /gone/x", // comparing
+               noShare});                                        // loading for the monitor
+}
+
+TEST_F(UpsertTest, NamesAreBytes) {
+    for (const char *share : {"my share", "100% %s%n", "\xff\xfe", "a\"b\\c", "#recycle"}) {
+        SCOPED_TRACE(share);
+        SetUp();
+        const std::string directory = "/volume1/"s + share;
+        platform.AddShare(share, directory);
+        const std::string path = "/"s + share + "/caf\xe9 %d\n\"x\"";
+        const std::string full = "/volume1" + path;
+        Json::Value request(Json::arrayValue);
+        request.append(PhotoFolder(path));
+        request[0]["name"] = "caf\xe9";
+        const DaemonPeer daemon;
+        Watch();
+        EXPECT_TRUE(IndexMgr::Upsert(request));
+        EXPECT_THAT(Steps(), ElementsAre(Changed(kFolderFile), Watched(directory, {full}), kStarted,
+                                         kSpotlightOn, kRestarted, Told(path)));
+        EXPECT_EQ(ReadJson(kFolderFile)[path], request[0]);
+        EXPECT_THAT(EventsIn(QueueOf(directory)),
+                    ElementsAre(Event(kSettingEvent, full, EverythingChanged())));
+        EXPECT_TRUE(IndexMgr::IsPathIndexed(path));
+    }
+}
+
+TEST_F(UpsertTest, PathsMayBeLongerThanTheSystemAllows) {
+    const std::string path = "/photos/" + std::string(5000, 'x');
+    Json::Value request(Json::arrayValue);
+    request.append(PhotoFolder(path));
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(request));
+    EXPECT_THAT(Steps(),
+                ElementsAre(Changed(kFolderFile), Watched(kPhotos, {"/volume1" + path}), kStarted,
+                            kSpotlightOn, kRestarted, Told(path), Changed(QueueOf(kPhotos))));
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)),
+                ElementsAre(Event(kSettingEvent, "/volume1" + path, EverythingChanged())));
+}
+
+TEST_F(UpsertTest, TheThousandAndFirstFolderIsRefused) {
+    std::vector<std::string> paths;
+    for (int i = 0; i < 1000; ++i) {
+        paths.push_back("/photos/" + std::to_string(i));
+    }
+    PutFolders(paths);
+    const std::string before = ReadText(kFolderFile);
+    EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/5","audio":true},
+                                           {"path":"/photos/new"}])")));
+    ExpectError(FILEINDEX_ERR_FOLDER_LIMIT);
+    ExpectLog({"folders:140 Exceed max folder size",
+               R"(index_mgr:* Upsert failed, folder={"path":"/photos/new"})"});
+    EXPECT_THAT(Steps(), IsEmpty());
+    EXPECT_EQ(ReadText(kFolderFile), before);
+}
+
+TEST_F(UpsertTest, AThousandFoldersCanBeChanged) {
+    std::vector<std::string> paths;
+    for (int i = 0; i < 999; ++i) {
+        paths.push_back("/photos/" + std::to_string(i));
+    }
+    PutFolders(paths);
+    platform.Answer("VLIBServiceStart", {-1, -1}); // far enough
+    EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/new"}])")));
+    EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/5","audio":true}])")));
+    ExpectLog({"index_mgr:* VLIBServiceStart failed: err=[0x0000 :0]",
+               "index_mgr:* VLIBServiceStart failed: err=[0x0000 :0]"});
+    EXPECT_EQ(StoredPaths().size(), 1000U);
+    EXPECT_EQ(ReadJson(kFolderFile)["/photos/5"]["audio"], true);
+}
+
+// --- bad elements -------------------------------------------------------------------------------
+
+struct BadElement {
+    const char *name;
+    const char *json;
+    std::vector<std::string> log;
+};
+
+class UpsertBadElementTest : public UpsertTest, public ::testing::WithParamInterface<BadElement> {};
+
+TEST_P(UpsertBadElementTest, IsABadParameterAndNothingIsSaved) {
+    PutFolders({"/photos/old"});
+    Json::Value request = TwoFolders();
+    request.append(Json(GetParam().json));
+    request.append(Json(R"({"path":"/music"})"));
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_NO_THROW(EXPECT_FALSE(IndexMgr::Upsert(request)));
+    ExpectError(FILEINDEX_ERR_BAD_PARAM);
+    ExpectLog(GetParam().log);
+    EXPECT_THAT(Steps(), IsEmpty());
+    EXPECT_THAT(StoredPaths(), ElementsAre("/photos/old"));
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Rows, UpsertBadElementTest,
+    ::testing::Values(
+        BadElement{
+            "Number", "5", {"folders:129 Bad param: 5", "index_mgr:* Upsert failed, folder=5"}},
+        BadElement{"Text",
+                   R"("/photos/x")",
+                   {R"(folders:129 Bad param: "/photos/x")",
+                    "index_mgr:* Upsert failed, folder=/photos/x"}},
+        BadElement{"Null",
+                   "null",
+                   {"folders:129 Bad param: null", "index_mgr:* Upsert failed, folder=null"}},
+        BadElement{"True",
+                   "true",
+                   {"folders:129 Bad param: true", "index_mgr:* Upsert failed, folder=true"}},
+        BadElement{"Array",
+                   R"(["path"])",
+                   {R"(folders:129 Bad param: ["path"])",
+                    R"(index_mgr:* Upsert failed, folder=["path"])"}},
+        BadElement{"NoPath",
+                   R"({"photo":true})",
+                   {R"(folders:129 Bad param: {"photo":true})",
+                    R"(index_mgr:* Upsert failed, folder={"photo":true})"}},
+        BadElement{"NumberAsPath",
+                   R"({"path":5})",
+                   {R"(folders:129 Bad param: {"path":5})",
+                    R"(index_mgr:* Upsert failed, folder={"path":5})"}},
+        BadElement{"ObjectAsPath",
+                   R"({"path":{"a":1}})",
+                   {R"(folders:129 Bad param: {"path":{"a":1}})",
+                    R"(index_mgr:* Upsert failed, folder={"path":{"a":1}})"}},
+        BadElement{"ArrayAsPath",
+                   R"({"path":["/photos/x"]})",
+                   {R"(folders:129 Bad param: {"path":["/photos/x"]})",
+                    R"(index_mgr:* Upsert failed, folder={"path":["/photos/x"]})"}},
+        BadElement{"NullAsPath",
+                   R"({"path":null})",
+                   {R"(folders:129 Bad param: {"path":null})",
+                    R"(index_mgr:* Upsert failed, folder={"path":null})"}},
+        BadElement{
+            "EmptyPath",
+            R"({"path":""})",
+            {"utils:389 GetShareNameByPath failed, path=", R"(folders:129 Bad param: {"path":""})",
+             R"(index_mgr:* Upsert failed, folder={"path":""})"}},
+        BadElement{"UnknownShare",
+                   R"({"path":"/nowhere/x"})",
+                   {R"(folders:129 Bad param: {"path":"/nowhere/x"})",
+                    R"(index_mgr:* Upsert failed, folder={"path":"/nowhere/x"})"}},
+        BadElement{"FullPath",
+                   R"({"path":"/volume1/photos/a"})",
+                   {R"(folders:129 Bad param: {"path":"/volume1/photos/a"})",
+                    R"(index_mgr:* Upsert failed, folder={"path":"/volume1/photos/a"})"}}),
+    NameOfRow());
+
+TEST_F(UpsertTest, FieldsOfAnotherTypeAreNoBadElements) {
+    PutFile(kFolderFile, R"({"/photos/a":{"name":"Mine","photo":true}})");
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(
+        Json(R"([{"path":"/photos/a","name":7,"photo":0,"audio":"true","extra":[]}])")));
+    EXPECT_EQ(ReadJson(kFolderFile)["/photos/a"],
+              Json(R"({"path":"/photos/a","name":"Mine","document":false,"audio":false,
+                       "video":false,"photo":true})"));
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)),
+                ElementsAre(Event(kSettingEvent, "/volume1/photos/a", NothingChanged())));
+}
+
+// --- each step failing in turn ------------------------------------------------------------------
+
+struct FailingStep {
+    const char *name;
+    Obstacle (*arrange)(FakePlatform &platform);
+    bool daemonRuns;
+    std::size_t steps; // how many of AllSteps() happen, the failing one included where it is one
+    std::vector<std::string> log;
+    _tag_fileindex_err_ error;
+    int leaks; // descriptors that the lock's attempts leave open
+};
+
+class UpsertFailureTest : public UpsertTest, public ::testing::WithParamInterface<FailingStep> {};
+
+TEST_P(UpsertFailureTest, EndsTheOperationAndLeavesWhatWasDone) {
+    const FailingStep &row = GetParam();
+    SetPlatformError();
+    const auto daemon = row.daemonRuns ? std::make_unique<DaemonPeer>() : nullptr;
+    const Obstacle obstacle = row.arrange(platform);
+    Watch();
+    EXPECT_FALSE(IndexMgr::Upsert(TwoFolders()));
+    ExpectLeakedDescriptors(row.leaks);
+    ExpectError(row.error);
+    ExpectLog(row.log);
+    std::vector<std::string> expected = AllSteps();
+    expected.resize(row.steps);
+    EXPECT_THAT(Steps(), ElementsAreArray(expected));
+    if (row.steps > 0) {
+        EXPECT_THAT(StoredPaths(), ElementsAre("/photos/a", "/video/b"));
+    }
+}
+
+constexpr char kSaveFailed[] =
+    "config:38 Failed to save json to /usr/vano/etc/fileindex/folder.conf";
+constexpr char kLoadFailed[] =
+    "config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf";
+
+INSTANTIATE_TEST_SUITE_P(
+    Rows, UpsertFailureTest,
+    ::testing::Values(FailingStep{"LockHeld",
+                                  [](FakePlatform &) -> Obstacle {
+                                      Fault::Quiet(Call::Usleep);
+                                      return std::make_shared<HoldLock>(kFolderLock);
+                                  },
+                                  true,
+                                  0,
+                                  {"config:74 Failed to lock folder"},
+                                  FILEINDEX_ERR_LOCK,
+                                  2},
+                      FailingStep{"LockFileRefused",
+                                  [](FakePlatform &) -> Obstacle {
+                                      Fault::FailPath(Call::Open, "fileidx_cfg_folder.lock",
+                                                      EACCES);
+                                      return nullptr;
+                                  },
+                                  true,
+                                  0,
+                                  {"config:74 Failed to lock folder"},
+                                  FILEINDEX_ERR_LOCK,
+                                  0},
+                      FailingStep{"SettingsNoJson",
+                                  [](FakePlatform &) -> Obstacle {
+                                      PutFile(kFolderFile, "{");
+                                      return nullptr;
+                                  },
+                                  true,
+                                  0,
+                                  {kLoadFailed},
+                                  FILEINDEX_ERR_LOAD,
+                                  0},
+                      FailingStep{"SettingsOfAnotherShape",
+                                  [](FakePlatform &) -> Obstacle {
+                                      PutFile(kFolderFile, "[ ]");
+                                      return nullptr;
+                                  },
+                                  true,
+                                  0,
+                                  {"folders:80 Malformed folders: []"},
+                                  FILEINDEX_ERR_MALFORMED,
+                                  0},
+                      FailingStep{"SaveOnAFullDisk",
+                                  [](FakePlatform &) -> Obstacle {
+                                      Fault::FailAlways(Call::Write, ENOSPC);
+                                      return nullptr;
+                                  },
+                                  true,
+                                  0,
+                                  {kSaveFailed},
+                                  FILEINDEX_ERR_SAVE,
+                                  0},
+                      FailingStep{"MonitorRefusesTheFirstShare",
+                                  [](FakePlatform &platform) -> Obstacle {
+                                      platform.Answer("MonitorQueue::Upsert", {0});
+                                      return nullptr;
+                                  },
+                                  true,
+                                  2,
+                                  {"index_mgr:* MonitorQueue::Add failed",
+                                   "index_mgr:* UpsertVANtifydCfg failed, share=photos"},
+                                  FILEINDEX_ERR_NONE,
+                                  0},
+                      FailingStep{"MonitorRefusesTheSecondShare",
+                                  [](FakePlatform &platform) -> Obstacle {
+                                      platform.Answer("MonitorQueue::Upsert", {1, 0});
+                                      return nullptr;
+                                  },
+                                  true,
+                                  3,
+                                  {"index_mgr:* MonitorQueue::Add failed",
+                                   "index_mgr:* UpsertVANtifydCfg failed, share=video"},
+                                  FILEINDEX_ERR_NONE,
+                                  0},
+                      FailingStep{"ShareGoneBeforeItsMonitor",
+                                  [](FakePlatform &platform) -> Obstacle {
+                                      platform.On("MonitorQueue::Upsert", [](const std::string &) {
+                                          FakePlatform::Get().RemoveShare("video");
+                                          return std::nullopt;
+                                      });
+                                      return nullptr;
+                                  },
+                                  true,
+                                  2,
+                                  {"utils:772 VANOShareGet failed, name=video, code=171",
+                                   "index_mgr:* FILEIDXQueuePathGet failed, share=video",
+                                   "index_mgr:* UpsertVANtifydCfg failed, share=video"},
+                                  FILEINDEX_ERR_NONE,
+                                  0},
+                      FailingStep{
+                          "ServiceDoesNotStart",
+                          [](FakePlatform &platform) -> Obstacle {
+                              platform.Answer("VLIBServiceStart", {-1});
+                              return nullptr;
+                          },
+                          true,
+                          4,
+                          {"index_mgr:* VLIBServiceStart failed: err=[0x00AB service.c:77]"},
+                          FILEINDEX_ERR_NONE,
+                          0},
+                      FailingStep{"NoDaemon",
+                                  [](FakePlatform &) -> Obstacle { return nullptr; },
+                                  false,
+                                  6,
+                                  {"index_mgr:* SendCammandToDaemon failed"},
+                                  FILEINDEX_ERR_NONE,
+                                  0},
+                      FailingStep{"DaemonGoneAfterTheFirstCommand",
+                                  [](FakePlatform &) -> Obstacle {
+                                      Fault::Fail(Call::Connect, ECONNREFUSED, 2);
+                                      return nullptr;
+                                  },
+                                  true,
+                                  7,
+                                  {"index_mgr:* SendCammandToDaemon failed"},
+                                  FILEINDEX_ERR_NONE,
+                                  0},
+                      FailingStep{"ShareGoneBeforeItsEvent",
+                                  [](FakePlatform &platform) -> Obstacle {
+                                      platform.On("VLIBServiceRestart", [](const std::string &) {
+                                          FakePlatform::Get().RemoveShare("video");
+                                          return std::nullopt;
+                                      });
+                                      return nullptr;
+                                  },
+                                  true,
+                                  9,
+                                  {"index_mgr:* GetFullPath failed, path=/video/b"},
+                                  FILEINDEX_ERR_PATH,
+                                  0}),
+    NameOfRow());
+
+TEST_F(UpsertTest, AnEventThatCannotBeQueuedMarksTheShareAndEndsTheOperation) {
+    RemoveTree(QueueOf(kPhotos));
+    MakeDirs(QueueOf(kPhotos)); // no file can be opened there
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_FALSE(IndexMgr::Upsert(TwoFolders()));
+    ExpectError(FILEINDEX_ERR_NONE);
+    ExpectLog({"index_mgr:* AddCustomEvent failed"});
+    std::vector<std::string> expected = AllSteps();
+    expected.resize(8);
+    expected.push_back(Changed(kStatusFile));
+    EXPECT_THAT(Steps(), ElementsAreArray(expected));
+    EXPECT_EQ(ReadJson(kStatusFile), Json(R"({"need_reindex":{"photos":true}})"));
+}
+
+TEST_F(UpsertTest, AStatusFileOfAnotherShapeMakesTheMarkFailAndNothingThrow) {
+    RemoveTree(QueueOf(kPhotos));
+    MakeDirs(QueueOf(kPhotos));
+    for (const char *status : {"[]", "7", R"("x")", R"({"need_reindex":5})"}) {
+        SCOPED_TRACE(status);
+        PutFile(kStatusFile, status);
+        const DaemonPeer daemon;
+        EXPECT_NO_THROW(EXPECT_FALSE(IndexMgr::Upsert(TwoFolders())));
+        ExpectLog({"utils:522 ShareSetNeedReindex failed, share=photos",
+                   "index_mgr:* AddCustomEvent failed"});
+        EXPECT_EQ(ReadText(kStatusFile), status);
+        EXPECT_FALSE(IsLocked(kFolderLock));
+        EXPECT_FALSE(IsLocked(kStatusLock));
+    }
+}
+
+TEST_F(UpsertTest, AnEventWhoseShareCannotBeToldMarksNoShareByName) {
+    platform.AnswerAlways("VANOShareNamePathGet", -1);
+    const DaemonPeer daemon;
+    EXPECT_FALSE(IndexMgr::Upsert(TwoFolders()));
+    ExpectLog({"utils:472 VANOShareNamePathGet failed, path=/volume1/photos/a",
+               "index_mgr:* AddCustomEvent failed"});
+    EXPECT_EQ(ReadJson(kStatusFile), Json(R"({"need_reindex":{"":true}})"));
+}
+
+TEST_F(UpsertTest, AQueueThatStaysBusyDropsTheEvent) {
+    Fault::Quiet(Call::Usleep);
+    const HoldLock busy(QueueOf(kPhotos));
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    EXPECT_THAT(EventsIn(QueueOf(kPhotos)), IsEmpty());
+    EXPECT_THAT(EventsIn(QueueOf(kVideo)),
+                ElementsAre(Event(kSettingEvent, "/volume1/video/b", EverythingChanged())));
+    EXPECT_FALSE(Exists(kStatusFile));
+}
+
+TEST_F(UpsertTest, AFailingSpotlightSwitchIsLoggedOnly) {
+    SetPlatformError();
+    platform.Answer("VANOSMBSetSpotlight", {-1});
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    ExpectLog({"index_mgr:* VANOSMBSetSpotlight failed: err=[0x00AB service.c:77]"});
+    std::vector<std::string> expected = AllSteps();
+    expected.erase(expected.begin() + 5); // no restart
+    EXPECT_THAT(Steps(), ElementsAreArray(expected));
+}
+
+TEST_F(UpsertTest, AFailingRestartIsLoggedOnly) {
+    SetPlatformError();
+    platform.lastError = 0x12345;
+    platform.Answer("VLIBServiceRestart", {-1});
+    const DaemonPeer daemon;
+    Watch();
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    ExpectLog({"index_mgr:* VLIBServiceRestart failed: err=[0x12345 service.c:77]"});
+    EXPECT_THAT(Steps(), ElementsAreArray(AllSteps()));
+    ExpectError(FILEINDEX_ERR_NONE);
+}
+
+// --- the lock -----------------------------------------------------------------------------------
+
+TEST_F(UpsertTest, TheLockIsHeldDuringEverySideEffect) {
+    std::vector<std::string> seen;
+    const auto look = [&](const std::string &where) {
+        seen.push_back(where + (IsLocked(kFolderLock) ? " locked" : " UNLOCKED"));
+    };
+    for (const char *function :
+         {"MonitorQueue::Upsert", "VLIBServiceStart", "VANOSMBIsEnableSpotlight",
+          "VANOSMBSetSpotlight", "VLIBServiceRestart"}) {
+        platform.On(function, [look, function](const std::string &) -> std::optional<int> {
+            look(function);
+            return std::nullopt;
+        });
+    }
+    for (const Call call : {Call::Rename, Call::Connect}) {
+        Fault::On(call, [look, call](CallInfo &) -> std::optional<long> {
+            look(call == Call::Rename ? "save" : "command");
+            return std::nullopt;
+        });
+    }
+    Fault::On(Call::Write, [look](CallInfo &info) -> std::optional<long> {
+        if (info.path == QueueOf(kPhotos)) {
+            look("event");
+        }
+        return std::nullopt;
+    });
+    const DaemonPeer daemon;
+    EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a"}])")));
+    EXPECT_THAT(seen,
+                ElementsAre("save locked", "MonitorQueue::Upsert locked", "VLIBServiceStart locked",
+                            "VANOSMBIsEnableSpotlight locked", "VANOSMBSetSpotlight locked",
+                            "VLIBServiceRestart locked", "command locked", "event locked"));
+}
+
+TEST_F(UpsertTest, AnotherWriterIsRefusedMeanwhile) {
+    bool other = true;
+    Fault::Quiet(Call::Usleep);
+    platform.On("VLIBServiceStart", [&](const std::string &) -> std::optional<int> {
+        other = IndexMgr::Upsert(Json("[]"));
+        return std::nullopt;
+    });
+    EXPECT_TRUE(IndexMgr::Upsert(Json("[]")));
+    EXPECT_FALSE(other);
+    EXPECT_EQ(platform.Calls("VLIBServiceStart"), 1U);
+    ExpectError(FILEINDEX_ERR_LOCK);
+    ExpectLog({"config:74 Failed to lock folder"});
+    ExpectLeakedDescriptors(2);
+}
+
+TEST_F(UpsertTest, AnExceptionReleasesTheLock) {
+    const DaemonPeer daemon;
+    for (const char *function : {"VANOShareGet", "MonitorQueue::Upsert", "VLIBServiceStart",
+                                 "VANOSMBSetSpotlight", "VANOShareNamePathGet", "VANOEAMKDir"}) {
+        SCOPED_TRACE(function);
+        platform.Reset();
+        platform.AddShare("photos", kPhotos);
+        platform.On(function, [](const std::string &) -> std::optional<int> {
+            throw std::runtime_error("the platform fails");
+        });
+        EXPECT_THROW((void)IndexMgr::Upsert(Json(R"([{"path":"/photos/a"}])")), std::runtime_error);
+        EXPECT_FALSE(IsLocked(kFolderLock));
+        EXPECT_EQ(platform.LiveRecords(), 0U);
+    }
+}
+
+TEST_F(UpsertTest, TheLockIsTakenOncePerCall) {
+    const DaemonPeer daemon;
+    Fault::On(Call::Flock, [](CallInfo &) -> std::optional<long> { return std::nullopt; });
+    EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
+    std::vector<long> operations;
+    for (const CallInfo &call : Fault::Log(Call::Flock)) {
+        if (call.path == kFolderLock) {
+            operations.push_back(call.number);
+        }
+    }
+    EXPECT_THAT(operations, ElementsAre(6, 8)); // exclusive without waiting, unlock
+}
+
+} // namespace
+
+} // namespace VANO::TESTS

@@ -1,0 +1,95 @@
+#ifndef FILEINDEX_TESTS_INDEX_MGR_FIXTURE_H
+#define FILEINDEX_TESTS_INDEX_MGR_FIXTURE_H
+
+// What the tests of IndexMgr start from: three shares with empty event queues, and the words for
+// what the operations do to the other parties.
+//
+//     PutFolders({"/photos/a"});
+//     Watch();
+//     EXPECT_TRUE(IndexMgr::Reindex(Json(R"(["/photos/a"])")));
+//     EXPECT_THAT(Steps(), ElementsAre(Changed(QueueOf("/volume1/photos"))));
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "support/fixture.h"
+
+namespace VANO::TESTS {
+
+constexpr char kPhotos[] = "/volume1/photos";
+constexpr char kVideo[] = "/volume1/video";
+constexpr char kMusic[] = "/volume2/music";
+
+constexpr int kReindexEvent = 65536;
+constexpr int kSettingEvent = 131072;
+
+// The locations inside a share's directory.
+std::string QueueOf(const std::string &directory);
+std::string DatabaseOf(const std::string &directory);
+
+// Entries of the event trace.
+std::string Changed(const std::string &file);
+std::string Locked(const std::string &file);
+std::string Unlocked(const std::string &file);
+std::string Made(const std::string &directory); // the share's metadata directory
+std::string Told(const std::string &command, const std::string &key, const std::string &value);
+std::string Watched(const std::string &directory, const std::vector<std::string> &fullPaths);
+std::string Unwatched(const std::string &directory);
+std::string Removed(const std::string &path);
+constexpr char kStarted[] = "VLIBServiceStart(fileindexd, 1)";
+constexpr char kStopped[] = "VLIBServiceStop(fileindexd, 1)";
+constexpr char kSpotlightOn[] = "VANOSMBSetSpotlight(true)";
+constexpr char kSpotlightOff[] = "VANOSMBSetSpotlight(false)";
+constexpr char kRestarted[] = "VLIBServiceRestart(samba)";
+
+// What a queue file holds: an object a line.
+std::vector<Json::Value> EventsIn(const std::string &queue);
+Json::Value Event(int code, const std::string &path, const Json::Value &data);
+
+// Which file types changed.
+Json::Value Report(bool document, bool audio, bool video, bool photo);
+Json::Value EverythingChanged();
+Json::Value NothingChanged();
+
+// A setting for photos only, as folder.conf holds it.
+Json::Value PhotoFolder(const std::string &path);
+
+// A JSON array of texts.
+Json::Value Paths(const std::vector<std::string> &paths);
+
+// What stands in an operation's way while it runs.
+using Obstacle = std::shared_ptr<void>;
+
+// Names a parameterised test after its row's `name`.
+struct NameOfRow {
+    template <typename Row>
+    std::string operator()(const ::testing::TestParamInfo<Row> &row) const {
+        return row.param.name;
+    }
+};
+
+class IndexMgrTest : public LibraryTest {
+  protected:
+    void SetUp() override;
+
+    // folder.conf with a setting for each path.
+    static void PutFolders(const std::vector<std::string> &paths);
+
+    // The paths that folder.conf holds.
+    static std::vector<std::string> StoredPaths();
+
+    // The trace begins here; the settings files and the queues are watched.
+    static void Watch();
+
+    // The effects without those that accompany others: log lines and metadata directories.
+    static std::vector<std::string> Steps();
+
+    // The platform's last error, as failed platform calls are logged with it:
+    // "err=[0x00AB service.c:77]".
+    void SetPlatformError();
+};
+
+} // namespace VANO::TESTS
+
+#endif
