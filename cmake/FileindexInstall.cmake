@@ -1,10 +1,12 @@
-# What `cmake --install` puts where: libraries, headers, the CMake package, the pkg-config file.
+# What `cmake --install` puts where: libraries, headers, the CMake package, the pkg-config file, the
+# administrator's tool.
 
 include(CMakePackageConfigHelpers)
 
 install(TARGETS fileindex vanoplatform
     EXPORT fileindexTargets
     LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}")
+install(TARGETS fileindexctl RUNTIME DESTINATION "${CMAKE_INSTALL_BINDIR}")
 install(DIRECTORY include/fileindex DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}")
 # For whoever writes a provider of the platform boundary.
 install(FILES src/platform/vano_platform.h src/platform/monitor_queue.h

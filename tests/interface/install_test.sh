@@ -46,6 +46,11 @@ gcc -std=c11 -Wall -Wextra -Werror "$source/examples/membership.c" $flags \
 # shellcheck disable=SC2086
 g++ -std=c++17 -Wall -Wextra -Werror "$source/examples/add_folder.cpp" $flags \
     -Wl,-rpath-link,"$library" -o "$work/pkgconfig/add_folder"
+
+echo "== the installed tool finds the installed library"
+"$prefix/bin/fileindexctl" --help >"$work/help.log" || fail "fileindexctl --help"
+grep -q '^Usage:' "$work/help.log" || fail "no usage in $(cat "$work/help.log")"
+
 export LD_LIBRARY_PATH=$library
 
 mkdir -p /usr/vano/etc/fileindex /volume1/photos/2016

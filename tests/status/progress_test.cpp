@@ -430,7 +430,7 @@ TEST_F(ProgressTest, AskingTakesNoLockAndChangesNothing) {
 }
 
 TEST_F(ProgressTest, AVeryLongLineIsAnEventToo) {
-    const std::string data(std::size_t{7} << 20, 'x');
+    const std::string data(std::size_t{10} << 20, 'x');
     PutFile(kQueue, R"({"event":1,"path":"/volume1/photos/trip","data":")" + data + "\"}\n");
     EXPECT_EQ(StatusOf(), "processing");
     ExpectLog({});

@@ -190,7 +190,10 @@ const std::vector<PendingRow> &PendingRows() {
         {R"({"event":65536,"path":"\/volume1\/photos\/trip"})"
          "\r",
          true},
+        {R"({"event":65536,"path":"\u002fvolume1/photos/\u0074rip"})", true},
         {R"({"event":131072,"path":"/volume1/photos/trip"})", false},
+        {R"({"event":65536,"path":"/volume1/photos","data":"/volume1/photos/trip"})", false},
+        {R"({"event":65536,"path":"/volume1/photos","data":"\n"})", false},
         {R"({"event":256,"path":"/volume1/photos/trip"})", false},
         {R"({"event":256,"path":"/x","path_old":"/volume1/photos/trip"})", false},
         {R"({"event":65536,"path":"/volume1/photos"})", false},
