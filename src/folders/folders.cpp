@@ -82,9 +82,10 @@ bool Folders::Get(Json::Value &out, const std::string &path) {
 
 bool Folders::List(std::vector<Folder> &out, const std::string &share) {
     std::vector<Folder> listed;
-    for (const auto &[path, folder] : folders) {
+    for (const auto &[key, folder] : folders) {
         std::string shareOfFolder;
-        if (share.empty() || (GetShareNameByPath(shareOfFolder, path) && shareOfFolder == share)) {
+        if (share.empty() ||
+            (GetShareNameByPath(shareOfFolder, folder.path) && shareOfFolder == share)) {
             listed.push_back(folder);
         }
     }

@@ -424,6 +424,26 @@ TEST_F(FileIoTest, RoomForARewriteIsTakenBeforeTheOldTextIsTouched) {
     EXPECT_EQ(ReadText("/volume1/target"), "old");
 }
 
+TEST_F(FileIoTest, AnInterruptedReservationIsTriedAgain) {
+    ASSERT_EQ(::symlink("/volume1/target", kFile), 0);
+    PutFile("/volume1/target", "old");
+    Fault::Fail(Call::Fallocate, EINTR);
+    EXPECT_TRUE(WriteFile(kFile, "new"));
+    EXPECT_EQ(ReadText("/volume1/target"), "new");
+}
+
+TEST_F(FileIoTest, AWriteOfNothingIsAFailureAndNotTriedAgain) {
+    PutFile(kFile, "old");
+    int writes = 0;
+    Fault::On(Call::Write, [&](CallInfo &) -> std::optional<long> {
+        errno = EINTR; // as an earlier call may have left it
+        return ++writes == 1 ? std::optional<long>(0) : std::nullopt;
+    });
+    EXPECT_FALSE(WriteFile(kFile, "new"));
+    Fault::Reset();
+    EXPECT_EQ(ReadText(kFile), "old");
+}
+
 TEST_F(FileIoTest, AFileSystemThatCannotReserveRoomIsWrittenToAllTheSame) {
     ASSERT_EQ(::symlink("/volume1/target", kFile), 0);
     PutFile("/volume1/target", "old and longer");

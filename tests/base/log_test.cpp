@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <clocale>
+#include <fileindex/config.h>
 #include <syslog.h>
 
 #include "support/fixture.h"
@@ -20,6 +21,14 @@ TEST_F(LogTest, UnitAndLinePrecedeTheMessageAtErrorPriority) {
     ASSERT_EQ(lines.size(), 1U);
     EXPECT_EQ(lines[0].priority, LOG_ERR);
     EXPECT_EQ(lines[0].text, "utils:389 failed, path=/photos, code=7");
+}
+
+TEST_F(LogTest, TheLogLevelHoldsNothingBack) {
+    for (const int level : {-1, 0, 2, 3, 6, 7, 8}) {
+        LOG_LEVEL = level;
+        LogError("utils", 1, "level=%d", level);
+        ExpectLog({"utils:1 level=" + std::to_string(level)});
+    }
 }
 
 // The compilers' format check does not know %m, which the C library does.

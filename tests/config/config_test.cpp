@@ -2,8 +2,10 @@
 
 #include <cerrno>
 #include <fcntl.h>
+#include <stdexcept>
 #include <sys/file.h>
 #include <sys/stat.h>
+#include <type_traits>
 #include <unistd.h>
 
 #include "support/fixture.h"
@@ -23,6 +25,8 @@ constexpr char kLoadFailed[] = "config:22 Failed to load json from /volume1/sett
 constexpr char kSaveFailed[] = "config:38 Failed to save json to /volume1/settings.conf";
 constexpr char kChmodFailed[] = "config:43 chmod failed, path=/volume1/settings.conf";
 constexpr char kLockFailed[] = "config:74 Failed to lock folder";
+
+static_assert(std::is_abstract_v<Config> && std::has_virtual_destructor_v<Config>);
 
 // The least that a settings file is.
 class Settings : public Config {
@@ -200,6 +204,31 @@ TEST_F(ConfigTest, TheLogLevelChangesNoMessage) {
         PutFile(kFile, "");
         ExpectLog({kLoadFailed, kLockFailed, kChmodFailed, kSaveFailed});
     }
+}
+
+TEST_F(ConfigTest, ASuccessKeepsTheLastError) {
+    ErrorHandler::SetError(FILEINDEX_ERR_FOLDER_LIMIT);
+    Settings settings;
+    EXPECT_TRUE(settings.Lock(true));
+    EXPECT_TRUE(settings.LoadJson()); // no file yet
+    EXPECT_TRUE(settings.SaveJson());
+    EXPECT_TRUE(settings.LoadJson());
+    settings.Unlock();
+    ExpectError(FILEINDEX_ERR_FOLDER_LIMIT);
+}
+
+TEST_F(ConfigTest, AnExceptionPassesThrough) {
+    class Nameless : public Settings {
+      public:
+        std::string GetLockPath() const override { throw std::runtime_error("no lock"); }
+        std::string GetPath() const override { throw std::runtime_error("no path"); }
+    };
+    Nameless settings;
+    EXPECT_THROW(settings.LoadJson(), std::runtime_error);
+    EXPECT_THROW(settings.SaveJson(), std::runtime_error);
+    EXPECT_THROW(settings.Lock(true), std::runtime_error);
+    ExpectError(FILEINDEX_ERR_NONE);
+    ExpectLog({});
 }
 
 // --- saving ---
@@ -403,6 +432,34 @@ TEST_P(ConfigContentionTest, ALockFileThatCannotBeOpenedEndsItAtOnce) {
     }
 }
 
+TEST_P(ConfigContentionTest, AnInterruptedOpenIsNotRepeated) {
+    for (const int error : {EINTR, EAGAIN}) {
+        Fault::Reset();
+        Fault::FailPath(Call::Open, kLock, error);
+        Fault::Count(Call::Usleep);
+        Settings settings;
+        EXPECT_FALSE(settings.Lock(GetParam())) << error;
+        EXPECT_EQ(Fault::Calls(Call::Open), 1U);
+        EXPECT_EQ(Fault::Calls(Call::Usleep), 0U);
+        ExpectError(FILEINDEX_ERR_LOCK);
+        ExpectLog({kLockFailed});
+    }
+}
+
+TEST_P(ConfigContentionTest, AFailedLockKeepsTheDocument) {
+    const HoldLock lock(kLock);
+    Fault::Quiet(Call::Usleep);
+    Settings settings;
+    settings.root = Json(R"({"kept":1})");
+    EXPECT_FALSE(settings.Lock(GetParam()));
+    EXPECT_EQ(settings.root, Json(R"({"kept":1})"));
+    EXPECT_GE(settings.lock_fd, 0); // of the last attempt
+    ExpectLog({kLockFailed});
+    settings.Unlock();
+    EXPECT_TRUE(IsLocked(kLock)); // the other's
+    ExpectLeakedDescriptors(2);
+}
+
 TEST_P(ConfigContentionTest, AnOpenThatFailsAtALaterAttemptEndsItThere) {
     const HoldLock lock(kLock);
     Fault::Fail(Call::Open, EMFILE, 2);
@@ -478,6 +535,21 @@ TEST_F(ConfigTest, UnlockingReleasesThenClosesAndKeepsTheNumber) {
     EXPECT_THAT(effects,
                 ElementsAre("flock(/volume1/settings.lock, 8)", "close(/volume1/settings.lock)"));
     EXPECT_EQ(settings.lock_fd, fd);
+}
+
+TEST_F(ConfigTest, UnlockingAgainRepeatsBothCallsOnTheOldNumber) {
+    Settings settings;
+    EXPECT_TRUE(settings.Lock(true));
+    const int fd = settings.lock_fd;
+    settings.Unlock();
+    Fault::Count(Call::Flock);
+    Fault::Count(Call::Close);
+    settings.Unlock();
+    ASSERT_EQ(Fault::Calls(Call::Flock), 1U);
+    EXPECT_EQ(Fault::Log(Call::Flock)[0].fd, fd);
+    EXPECT_EQ(Fault::Log(Call::Flock)[0].number, LOCK_UN);
+    ASSERT_EQ(Fault::Calls(Call::Close), 1U);
+    EXPECT_EQ(Fault::Log(Call::Close)[0].fd, fd);
 }
 
 TEST_F(ConfigTest, UnlockingWhatWasNeverLockedDoesNothing) {

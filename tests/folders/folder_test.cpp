@@ -149,6 +149,27 @@ TEST_F(FolderTest, ReloadOfAnUnresolvableFolderStillReads) {
     ExpectError(FILEINDEX_ERR_PATH);
 }
 
+TEST_F(FolderTest, ReloadTakesThePathFromTheCallerToo) {
+    Folder folder;
+    EXPECT_TRUE(folder.Reload("/photos/a", Json(R"({"path":"/photos/b","name":5})")));
+    EXPECT_EQ(folder.path, "/photos/a");
+    EXPECT_EQ(folder.full_path, "/volume1/photos/a");
+    EXPECT_EQ(folder.name, "");
+}
+
+TEST_F(FolderTest, ASuccessKeepsTheLastError) {
+    ErrorHandler::SetError(FILEINDEX_ERR_SAVE);
+    Folder folder;
+    EXPECT_TRUE(folder.Load("/photos/a", Json("{}")));
+    EXPECT_TRUE(folder.Reload("/photos/a", Json("{}")));
+    EXPECT_TRUE(folder.SetPath("/photos/a"));
+    folder.full_path.clear();
+    EXPECT_EQ(folder.GetFullPath(), "/volume1/photos/a");
+    Json::Value object(Json::objectValue);
+    EXPECT_TRUE(folder.AddToJson(object));
+    ExpectError(FILEINDEX_ERR_SAVE);
+}
+
 TEST_F(FolderTest, TheNewPathMayBeTheRecordsOwn) {
     Folder folder = FullFolder();
     EXPECT_TRUE(folder.Load(folder.path, Json("{}")));

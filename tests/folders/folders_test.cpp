@@ -1,6 +1,8 @@
 #include <fileindex/folders.h>
 
 #include <cerrno>
+#include <map>
+#include <sys/file.h>
 #include <type_traits>
 
 #include "support/fixture.h"
@@ -17,6 +19,8 @@ constexpr char kAllChanged[] = R"({"document":true,"audio":true,"video":true,"ph
 constexpr char kNoneChanged[] = R"({"document":false,"audio":false,"video":false,"photo":false})";
 
 static_assert(std::is_base_of_v<Config, Folders>);
+// Ordered by the bytes of the paths.
+static_assert(std::is_same_v<decltype(Folders::folders), std::map<std::string, Folder>>);
 
 // The shares of every test: photos and music on /volume1, video on /volume2.
 class FoldersTest : public LibraryTest {
@@ -61,6 +65,35 @@ TEST_F(FoldersTest, ANewObjectIsEmptyAndUnlocked) {
     EXPECT_THAT(folders.folders, IsEmpty());
     EXPECT_EQ(folders.root, Json("{}"));
     EXPECT_EQ(folders.lock_fd, -1);
+}
+
+TEST_F(FoldersTest, DestructionDoesNotUnlock) {
+    int fd = -1;
+    {
+        Folders folders;
+        ASSERT_TRUE(folders.Lock(true));
+        fd = folders.lock_fd;
+    }
+    EXPECT_TRUE(IsLocked(kFolderLock));
+    EXPECT_EQ(::flock(fd, LOCK_UN), 0);
+    ExpectLeakedDescriptors(1);
+}
+
+TEST_F(FoldersTest, ASuccessKeepsTheLastError) {
+    ErrorHandler::SetError(FILEINDEX_ERR_LOCK);
+    Folders folders;
+    EXPECT_TRUE(folders.Load());
+    Insert(folders, R"({"path":"/photos/a"})");
+    Insert(folders, R"({"path":"/photos/a","photo":true})");
+    Json::Value out;
+    EXPECT_TRUE(folders.Get(out, "/photos/a"));
+    std::vector<Folder> list;
+    EXPECT_TRUE(folders.List(list, "photos"));
+    EXPECT_TRUE(folders.List(out, 0, 10, "", "", Json("[]")));
+    EXPECT_TRUE(folders.Delete(out, "/photos/a"));
+    EXPECT_TRUE(folders.Save());
+    EXPECT_TRUE(Folders().Load());
+    ExpectError(FILEINDEX_ERR_LOCK);
 }
 
 // --- loading ---
@@ -336,6 +369,32 @@ TEST_F(FoldersTest, UpsertKeepsFieldsThatTheRequestLacks) {
     EXPECT_EQ(folders.folders.size(), 1U);
 }
 
+TEST_F(FoldersTest, UpdatingASettingWhoseShareCameBackResolvesItsPath) {
+    PutFile(kFolderFile, R"({"/later/a":{"name":"A","photo":true}})");
+    Folders folders;
+    EXPECT_TRUE(folders.Load());
+    ExpectError(FILEINDEX_ERR_PATH);
+    EXPECT_EQ(folders.folders.at("/later/a").full_path, "");
+    platform.AddShare("later", "/volume2/later");
+    Insert(folders, R"({"path":"/later/a","video":true})");
+    const Folder &folder = folders.folders.at("/later/a");
+    EXPECT_EQ(folder.full_path, "/volume2/later/a");
+    EXPECT_EQ(folder.name, "A");
+    EXPECT_TRUE(folder.photo && folder.video);
+}
+
+TEST_F(FoldersTest, ASettingWhoseShareIsGoneCannotBeUpdated) {
+    PutFile(kFolderFile, R"({"/none/a":{"name":"A"}})");
+    Folders folders;
+    EXPECT_TRUE(folders.Load());
+    Json::Value changes = "before";
+    EXPECT_FALSE(folders.Upsert(changes, Json(R"({"path":"/none/a","name":"B"})")));
+    EXPECT_EQ(changes, Json::Value("before"));
+    EXPECT_EQ(folders.folders.at("/none/a").name, "A");
+    ExpectError(FILEINDEX_ERR_BAD_PARAM);
+    ExpectLog({R"(folders:129 Bad param: {"name":"B","path":"/none/a"})"});
+}
+
 TEST_F(FoldersTest, UpsertIgnoresMistypedFields) {
     Folders folders;
     Insert(folders, R"({"path":"/photos/a","name":"A","photo":true})");
@@ -542,8 +601,10 @@ TEST_F(FoldersTest, DeletingAnUnresolvablePathSucceedsWithoutAReport) {
     EXPECT_TRUE(folders.Delete(changes, "/none/b"));
     EXPECT_EQ(changes, Json::Value("before"));
     ExpectLog({});
+    ErrorHandler::SetError(FILEINDEX_ERR_SAVE);
     EXPECT_TRUE(folders.Delete(changes, ""));
     EXPECT_EQ(changes, Json::Value("before"));
+    ExpectError(FILEINDEX_ERR_SAVE); // none of its own
     ExpectLog({"utils:389 GetShareNameByPath failed, path="});
 }
 

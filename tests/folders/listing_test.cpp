@@ -306,6 +306,14 @@ TEST_F(ListingTest, IsValidTellsWhetherTheFolderCanBeIndexed) {
     ExpectLog({"utils:191 GetFullPath failed, path=/photos/trip"});
 }
 
+TEST_F(ListingTest, AFactThatIsFoundKeepsTheLastError) {
+    const Folder folder = Add("/photos/trip");
+    ErrorHandler::SetError(FILEINDEX_ERR_SAVE);
+    EXPECT_EQ(folder.asJson(Json(R"(["status","is_valid"])"))["additional"],
+              Json(R"({"status":"finished","is_valid":true})"));
+    ExpectError(FILEINDEX_ERR_SAVE);
+}
+
 TEST_F(ListingTest, AnUnknownFactLeavesTheOutputAlone) {
     const Folder folder = Add("/photos/trip");
     for (const std::string key : {"Status", "STATUS", "status ", "valid", "", "path", "%s"}) {

@@ -90,8 +90,12 @@ TEST_F(IndexRulesTest, BothPropertiesAreAskedBeforeEitherIsLookedAt) {
 TEST_F(IndexRulesTest, APropertyThatCannotBeReadRefuses) {
     platform.AddShare("photos", kPhotos);
     for (const char *property : {"VLIBShareIsEncryptedGet", "VLIBShareIsReadOnlyGet"}) {
-        platform.Answer(property, {-1});
-        EXPECT_FALSE(CanBeIndexed("photos")) << property;
+        for (const int failure : {-1, -2}) {
+            platform.Answer(property, {failure});
+            EXPECT_FALSE(CanBeIndexed("photos")) << property << failure;
+        }
+        platform.Answer(property, {1}); // not negative: read
+        EXPECT_TRUE(CanBeIndexed("photos")) << property;
     }
     platform.AnswerAlways("VLIBShareIsEncryptedGet", -1);
     platform.AnswerAlways("VLIBShareIsReadOnlyGet", -1);
@@ -154,6 +158,15 @@ TEST_F(SkipTest, TheFileSystemIsAskedFirst) {
     EXPECT_THAT(platform.Trace(), ElementsAre("VANOGetFSType(noslash, 0)"));
 }
 
+TEST_F(SkipTest, TheRulesAreAskedInTheirOrder) {
+    EXPECT_FALSE(IsSkipIndex("/v/#snapshot/#recycle/a"));
+    EXPECT_THAT(platform.Trace(),
+                ElementsAre("VANOGetFSType(/v/#snapshot/#recycle/a, 0)", "VANOEAIsHiddenDir(a)",
+                            "VANOShareIsShareRecycle(/v/#snapshot/#recycle/a)",
+                            "VLIBFhsPathInSnapshot(/v/#snapshot/#recycle/a)", "VANOFSIsRemoteFS(1)",
+                            "VANOFSIsImageFS(1)"));
+}
+
 TEST_F(SkipTest, ANameWithoutSlashIsLeftOut) {
     EXPECT_TRUE(IsSkipIndex("noslash"));
     EXPECT_TRUE(IsSkipIndex(""));
@@ -182,8 +195,10 @@ TEST_F(SkipTest, ASnapshotTakesTheNameAndThePlatformsWord) {
     EXPECT_FALSE(IsSkipIndex("/volume1/photos/#snapshots"));
     EXPECT_FALSE(IsSkipIndex("/volume1/photos/plain"));
     EXPECT_EQ(platform.Calls("VLIBFhsPathInSnapshot"), 2U);
-    platform.AnswerAlways("VLIBFhsPathInSnapshot", -1); // fails, with the flag set
-    EXPECT_FALSE(IsSkipIndex("/volume1/photos/#snapshot/a"));
+    for (const int failure : {-1, 1}) { // with the flag set; 0 alone is success
+        platform.AnswerAlways("VLIBFhsPathInSnapshot", failure);
+        EXPECT_FALSE(IsSkipIndex("/volume1/photos/#snapshot/a")) << failure;
+    }
 }
 
 TEST_F(SkipTest, EarlierRulesHoldOnAnUnknownFileSystemToo) {
@@ -225,6 +240,11 @@ TEST_F(SkipTest, NothingIsLoggedAndNoErrorSet) {
     EXPECT_TRUE(IsSkipIndex("/" + std::string(5000, 'a')));
     ExpectError(FILEINDEX_ERR_NONE);
     ExpectLog({});
+}
+
+TEST_F(SkipTest, EveryAnswerButZeroMeansAnImage) {
+    platform.AnswerAlways("VANOFSIsImageFS", -1);
+    EXPECT_TRUE(IsSkipIndex("/volume1/photos/a"));
 }
 
 // --- room on a share ---
@@ -273,6 +293,16 @@ TEST_F(SpaceTest, ANonZeroAnswerNeedsNoReason) {
     platform.Answer("VANOQuotaIsEnough", {-1});
     EXPECT_TRUE(IsShareSpaceEnough("photos"));
     EXPECT_EQ(platform.Calls("VLIBCErrGet"), 0U);
+}
+
+TEST_F(SpaceTest, TheLastErrorIsKept) {
+    platform.AddShare("photos", kPhotos);
+    ErrorHandler::SetError(FILEINDEX_ERR_SAVE);
+    EXPECT_TRUE(IsShareSpaceEnough("photos"));
+    platform.quotaIsEnough = false;
+    platform.lastError = 0x2900;
+    EXPECT_FALSE(IsShareSpaceEnough("photos"));
+    ExpectError(FILEINDEX_ERR_SAVE);
 }
 
 TEST_F(SpaceTest, AnUnknownShareHasNoRoomAndIsLogged) {
@@ -385,6 +415,34 @@ TEST_F(FullPathTest, AShareThatCannotBeIndexedRefusesSilently) {
     ExpectLog({});
 }
 
+TEST_F(FullPathTest, AnExcludedShareRefusesSilently) {
+    platform.AddShare("NetBackup", "/volume1/NetBackup");
+    MakeDirs("/volume1/NetBackup");
+    EXPECT_FALSE(CanFullPathBeIndexed("/volume1/NetBackup"));
+    ExpectError(FILEINDEX_ERR_NONE);
+    ExpectLog({});
+}
+
+TEST_F(FullPathTest, AnAllowedFolderKeepsTheLastError) {
+    ErrorHandler::SetError(FILEINDEX_ERR_SAVE);
+    EXPECT_TRUE(CanFullPathBeIndexed("/volume1/photos/trip"));
+    EXPECT_TRUE(CanPathBeIndexed("/photos/trip"));
+    ExpectError(FILEINDEX_ERR_SAVE);
+}
+
+TEST_F(FullPathTest, EveryAnswerButZeroMeansARecycleBinOrAFileSystemThatIsRefused) {
+    const std::string path = "/volume1/photos/#recycle";
+    MakeDirs(path);
+    for (const char *question :
+         {"VANOShareIsShareRecycle", "VANOFSIsRemoteFS", "VANOFSIsImageFS"}) {
+        for (const int answer : {-1, 1, 2}) {
+            platform.Answer(question, {answer});
+            EXPECT_FALSE(CanFullPathBeIndexed(path)) << question << answer;
+        }
+    }
+    EXPECT_TRUE(CanFullPathBeIndexed(path));
+}
+
 TEST_F(FullPathTest, AMountPointIsRefusedUnlessItsShareUsesEncryption) {
     const std::string path = "/volume1/photos/trip";
     platform.mountPoints = {path};
@@ -410,13 +468,15 @@ TEST_F(FullPathTest, OnlyTheAnswerOneMeansAMountPoint) {
 
 TEST_F(FullPathTest, ADetourInThePathIsRefused) {
     // /volume1/photos/trip/a
-    //                 link -> trip
+    //                 link, tri -> trip
     MakeDirs("/volume1/photos/trip/a");
+    ASSERT_EQ(::symlink("trip", "/volume1/photos/tri"), 0);
     ASSERT_EQ(::symlink("trip", "/volume1/photos/link"), 0);
     for (const char *path :
          {"/volume1/photos/", "/volume1/photos/trip/", "/volume1/photos//trip",
           "/volume1/photos/./trip", "/volume1/photos/trip/../trip", "/volume1/photos/link",
-          "/volume1/photos/link/a", "/volume1/photos/none", "/volume1/photos/trip/."}) {
+          "/volume1/photos/link/a", "/volume1/photos/tri", "/volume1/photos/none",
+          "/volume1/photos/trip/."}) {
         EXPECT_FALSE(CanFullPathBeIndexed(path)) << path;
         ExpectError(FILEINDEX_ERR_NONE);
         ExpectLog({std::string("utils:263 check realpath failed, path=") + path});
@@ -537,6 +597,18 @@ TEST_F(GoverningTest, WholeComponentsAreCompared) {
                         {"/volume1/a", false},     {"/volume1/a/B", false},
                         {"/volume1/a/b c", false}, {"", false}};
     for (const Row &row : rows) {
+        EXPECT_EQ(GetMostSuitableCfg(folders, row.path).isMember("name"), row.expected) << row.path;
+    }
+}
+
+TEST_F(GoverningTest, ATrailingSlashOfTheSettingIsAComponentOfItsOwn) {
+    const std::vector<Folder> folders = {FolderAt("/volume1/a/", "a")};
+    struct Row {
+        const char *path;
+        bool expected;
+    };
+    for (const Row &row : {Row{"/volume1/a/", true}, Row{"/volume1/a//b", true},
+                           Row{"/volume1/a", false}, Row{"/volume1/a/b", false}}) {
         EXPECT_EQ(GetMostSuitableCfg(folders, row.path).isMember("name"), row.expected) << row.path;
     }
 }

@@ -116,6 +116,34 @@ TEST_F(SharePathTest, AnUnknownShareSetsTheErrorAndLogsNothing) {
     EXPECT_THAT(platform.Trace(), ElementsAre("VANOShareGet(none)"));
 }
 
+TEST_F(SharePathTest, EveryNegativeResultIsAFailure) {
+    platform.AddShare("photos", "/volume1/photos");
+    for (const int result : {-1, -2, -100}) {
+        platform.Answer("VANOShareGet", {result});
+        std::string fullPath;
+        EXPECT_FALSE(GetFullPath(fullPath, "/photos/a")) << result;
+        ExpectError(FILEINDEX_ERR_PATH);
+        platform.Answer("VANOShareNamePathGet", {result});
+        std::string name;
+        std::string path;
+        EXPECT_FALSE(GetShareNamePathByFullPath(name, path, "/volume1/photos/a")) << result;
+        ExpectError(FILEINDEX_ERR_PATH);
+        ExpectLog({"utils:418 VANOShareNamePathGet failed, path=/volume1/photos/a"});
+    }
+    EXPECT_EQ(platform.Calls("VANOShareFree"), 0U);
+}
+
+TEST_F(SharePathTest, ASuccessKeepsTheLastError) {
+    platform.AddShare("photos", "/volume1/photos");
+    ErrorHandler::SetError(FILEINDEX_ERR_SAVE);
+    std::string name;
+    std::string path;
+    EXPECT_TRUE(GetShareNameByPath(name, "/photos/a"));
+    EXPECT_TRUE(GetFullPath(path, "/photos/a"));
+    EXPECT_TRUE(GetShareNamePathByFullPath(name, path, "/volume1/photos/a"));
+    ExpectError(FILEINDEX_ERR_SAVE);
+}
+
 TEST_F(SharePathTest, AnEmptyPathIsLoggedAndAsksNothing) {
     std::string fullPath = "before";
     EXPECT_FALSE(GetFullPath(fullPath, ""));
@@ -163,12 +191,14 @@ TEST_F(SharePathTest, AFullPathIsLookedUpWithBuffersOfThePlatformsSizes) {
 }
 
 TEST_F(SharePathTest, BuffersThatThePlatformLeavesAreEmpty) {
-    platform.Answer("VANOShareNamePathGet", {0});
-    std::string name = "before";
-    std::string path = "before";
-    EXPECT_TRUE(GetShareNamePathByFullPath(name, path, "/volume1/photos"));
-    EXPECT_EQ(name, "");
-    EXPECT_EQ(path, "");
+    for (const int result : {0, 1, 5}) { // none of them negative
+        platform.Answer("VANOShareNamePathGet", {result});
+        std::string name = "before";
+        std::string path = "before";
+        EXPECT_TRUE(GetShareNamePathByFullPath(name, path, "/volume1/photos")) << result;
+        EXPECT_EQ(name, "");
+        EXPECT_EQ(path, "");
+    }
 }
 
 TEST_F(SharePathTest, AFullPathInNoShareIsLoggedAndLeavesTheOutputs) {
