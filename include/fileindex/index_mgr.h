@@ -87,7 +87,7 @@ class IndexMgr {
     FILEINDEX_API static bool Delete(const Json::Value &request);
 
     /// Queues folders for a new index and revives those of their shares that ran out of space.
-    /// Takes no lock of its own. Reads folder.conf and status.conf once for each share, and the
+    /// Takes no lock of its own. Reads folder.conf once for each share, and status.conf and the
     /// share's queue once for each path.
     ///
     /// @param jsArrPath array of share paths.

@@ -14,8 +14,6 @@ const Json::CharReaderBuilder &ReaderSettings() {
     static const Json::CharReaderBuilder settings = [] {
         Json::CharReaderBuilder builder;
         builder["collectComments"] = false;
-        builder["allowComments"] = false;
-        builder["allowTrailingCommas"] = false;
         builder["failIfExtra"] = true;
         return builder;
     }();
@@ -33,9 +31,9 @@ const Json::StreamWriterBuilder &WriterSettings() {
     return settings;
 }
 
-// Whatever its settings say, the JSON library lets comments inside an object or array pass, a comma
-// after a last member with an empty name, and everything behind a zero byte. (Its lax numbers and
-// raw control characters in strings stay: they take nothing away from what the text means.)
+// Comments, trailing commas, and whatever stands behind a zero byte. The JSON library's settings
+// refuse some of these in some places only, so all are found here. (Its lax numbers and raw control
+// characters in strings stay: they take nothing away from what the text means.)
 bool HasLibraryExtension(std::string_view text) {
     bool inString = false;
     bool afterComma = false;

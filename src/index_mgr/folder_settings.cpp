@@ -178,8 +178,8 @@ bool SettleShares(const std::set<std::string> &shares) {
 
 // --- Reindex, step by step ----------------------------------------------------------------------
 
-// Checks every path before anything is done. `fullShares` receives the shares out of space. Each
-// share is asked about once: every question reads a settings file.
+// Checks every path before anything is done. `fullShares` receives the shares out of space. Whether
+// a share is indexed is asked once: each time folder.conf is read.
 bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
     std::set<std::string> checked;
     for (const Json::Value &element : paths) {
@@ -193,10 +193,7 @@ bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
                      path.c_str());
             return false;
         }
-        if (!checked.insert(share).second) {
-            continue;
-        }
-        if (!IndexMgr::IsShareIndexed(share)) {
+        if (checked.insert(share).second && !IndexMgr::IsShareIndexed(share)) {
             return false;
         }
         if (StatusMgr::ShareIsNoSpace(share)) {

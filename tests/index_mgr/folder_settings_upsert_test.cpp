@@ -334,6 +334,11 @@ INSTANTIATE_TEST_SUITE_P(
                    R"("/photos/x")",
                    {R"(folders:129 Bad param: "/photos/x")",
                     "index_mgr:* Upsert failed, folder=/photos/x"}},
+        // Cut at the zero byte it would be the share photos.
+        BadElement{"ZeroByteInTheShareName",
+                   R"({"path":"/photos\u0000x/a"})",
+                   {R"(folders:129 Bad param: {"path":"/photos\u0000x/a"})",
+                    R"(index_mgr:* Upsert failed, folder={"path":"/photos\u0000x/a"})"}},
         BadElement{"Null",
                    "null",
                    {"folders:129 Bad param: null", "index_mgr:* Upsert failed, folder=null"}},

@@ -2,6 +2,7 @@
 #include <fileindex/index_mgr.h>
 
 #include <new>
+#include <thread>
 
 #include "index_mgr/index_mgr_fixture.h"
 
@@ -9,6 +10,7 @@ namespace VANO::TESTS {
 
 namespace {
 
+using ::testing::Each;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using namespace std::string_literals;
@@ -212,6 +214,19 @@ TEST_F(MembershipTest, AFolderThatNoLongerResolvesCoversNoFullPath) {
     EXPECT_TRUE(IndexMgr::IsPathContainIndexed("/gone"));
 }
 
+TEST_F(MembershipTest, TheFirstMatchEndsTheWalk) {
+    const std::vector<Folder> folders = {FolderAt("/video/b", "/volume1/video/b"),
+                                         FolderAt("/video/b/c", "/volume1/video/b/c"),
+                                         FolderAt("/gone/z")};
+    EXPECT_TRUE(IndexMgr::IsFullPathIndexed("/volume1/video/b/c", folders));
+    ExpectLog({}); // the last folder was not resolved
+    EXPECT_FALSE(IndexMgr::IsFullPathIndexed("/volume1/music", folders));
+    ExpectLog({"folder:16 Failed to get full path from /gone/z"});
+    PutFolders({"/video/b", "/zgone/z"});
+    EXPECT_TRUE(IndexMgr::IsFullPathIndexed("/volume1/video/b/c"));
+    ExpectLog({});
+}
+
 TEST_F(MembershipTest, AShareIsIndexedThroughAnyFolderInIt) {
     PutFolders({"/music", "/photos/a/deep/one"});
     EXPECT_TRUE(IndexMgr::IsShareIndexed("music"));
@@ -300,6 +315,29 @@ TEST_F(MembershipTest, QueriesAnswerWhileAWriterHoldsTheLock) {
     EXPECT_TRUE(IndexMgr::IsPathIndexed("/video/a"));
     std::vector<Folder> folders;
     EXPECT_TRUE(IndexMgr::List(folders));
+}
+
+TEST_F(MembershipTest, ThreadsAskAtTheSameTime) {
+    constexpr int kThreads = 4;
+    constexpr int kQuestions = 25;
+    PutFolders({"/photos/a", "/video/b"});
+    std::vector<int> right(kThreads, 0);
+    std::vector<std::thread> threads;
+    for (int &answers : right) {
+        threads.emplace_back([&answers] {
+            for (int question = 0; question < kQuestions; ++question) {
+                answers += IndexMgr::IsShareIndexed("video") ? 1 : 0;
+                answers += IndexMgr::IsPathIndexed("/photos/a/x") ? 1 : 0;
+                answers += IndexMgr::IsPathContainIndexed("/photos") ? 1 : 0;
+                answers += IndexMgr::IsFullPathIndexed("/volume1/video/b") ? 1 : 0;
+                answers += IndexMgr::IsPathIndexed("/music") ? 0 : 1;
+            }
+        });
+    }
+    for (std::thread &thread : threads) {
+        thread.join();
+    }
+    EXPECT_THAT(right, Each(kQuestions * 5));
 }
 
 TEST_F(MembershipTest, SettingsThatCannotBeLoadedAnswerNo) {

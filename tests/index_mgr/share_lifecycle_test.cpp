@@ -488,6 +488,27 @@ TEST_F(CleanShareIndexDataTest, AnUnknownShareIsAnErrorAndNothingIsRemoved) {
     EXPECT_THAT(Steps(), IsEmpty());
 }
 
+// Cut, the location is the share itself or something in it.
+TEST_F(CleanShareIndexDataTest, ALocationThatWouldBeCutIsNotRemoved) {
+    std::string directory = "/volume1";
+    while (directory.size() < 4095 - 200) {
+        directory += "/" + std::string(180, 'd');
+    }
+    directory += "/" + std::string(4094 - directory.size(), 'd');
+    platform.AddShare("deep", directory);
+    platform.AnswerAlways("VANOEAMKDir", 0);
+    Watch();
+    EXPECT_FALSE(IndexMgr::CleanShareIndexData("deep"));
+    ExpectLog({"index_mgr:* FILEIDXQueuePathGet failed, share=deep"});
+    EXPECT_EQ(platform.Calls("VLIBCExec"), 0U);
+}
+
+TEST_F(CleanShareIndexDataTest, ANameWithAZeroByteIsNoShares) {
+    EXPECT_FALSE(IndexMgr::CleanShareIndexData("photos\0x"s));
+    ExpectLog({"index_mgr:* FILEIDXQueuePathGet failed, share=photos"});
+    EXPECT_EQ(platform.Calls("VLIBCExec"), 0U);
+}
+
 TEST_F(CleanShareIndexDataTest, AShareThatVanishesMeanwhileKeepsItsDatabase) {
     platform.On("VLIBCExec", [&](const std::string &) -> std::optional<int> {
         platform.RemoveShare("photos");

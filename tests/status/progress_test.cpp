@@ -309,6 +309,16 @@ TEST_F(ProgressTest, AFormerPathThatIsNoTextCountsAsEmpty) {
     }
 }
 
+TEST_F(ProgressTest, AMalformedMovesFormerPathIsNotCarriedOver) {
+    for (const std::string line :
+         {R"({"event":256,"path_old":"/volume1/photos/trip/a"})",
+          R"({"event":256,"path":5,"path_old":"/volume1/photos/trip/a"})"}) {
+        PutFile(kQueue, line + "\n" + Event("/volume1/photos/other"));
+        EXPECT_EQ(StatusOf(), "finished") << line;
+        ExpectLog({Malformed(line)});
+    }
+}
+
 TEST_F(ProgressTest, AMoveWithoutAFormerPathIsAnEvent) {
     PutFile(kQueue, Event("/volume1/photos/trip/a", 256));
     EXPECT_EQ(StatusOf(), "processing");
@@ -627,6 +637,21 @@ TEST_F(ServiceStatusTest, SharesOutOfSpaceAreNotMentioned) {
     EXPECT_EQ(ServiceStatus(), "finished");
     PutFile(kQueue, kWaiting);
     EXPECT_EQ(ServiceStatus(), "processing");
+}
+
+TEST_F(ServiceStatusTest, AnEndedPauseStaysInTheFile) {
+    SetFolders({"/photos/trip"});
+    SetResumeTime(kNow - 1);
+    PutFile(kQueue, kWaiting);
+    EventTrace::Get().Clear();
+    EventTrace::Get().WatchFile(kStatusFile);
+    Fault::Count(Call::Flock);
+    EXPECT_EQ(StatusOf(), "processing");
+    EXPECT_EQ(ServiceStatus(), "processing");
+    EXPECT_THAT(Effects(), ElementsAre("VANOEAMKDir(0, /volume1/photos/@eaDir)",
+                                       "VANOEAMKDir(0, /volume1/photos/@eaDir)"));
+    EXPECT_EQ(Fault::Calls(Call::Flock), 0U);
+    EXPECT_EQ(ReadText(kStatusFile), R"({"resume_time":1699999999})");
 }
 
 TEST_F(ServiceStatusTest, AskingTakesNoLock) {

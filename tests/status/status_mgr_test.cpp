@@ -397,6 +397,28 @@ TEST_F(StatusMgrTest, ReadersOfAnotherShapeAnswerNo) {
     ExpectError(FILEINDEX_ERR_NONE);
 }
 
+TEST_F(StatusMgrTest, AStepMarkThatConvertsToNoBooleanThrows) {
+    PutFile(kStatusFile, R"({"step":"true"})");
+    EXPECT_THROW((void)StatusMgr::IsUpdated("step"), Json::Exception);
+    EXPECT_FALSE(StatusMgr::IsUpdated("other"));
+    EXPECT_FALSE(Exists(kStatusLock));
+}
+
+TEST_F(StatusMgrTest, EachCallReadsTheFileAnew) {
+    for (const bool marked : {true, false, true}) {
+        PutFile(kStatusFile,
+                marked ? R"({"resume_time":0,"no_space":{"a":true},"need_reindex":{"a":true},
+                             "step":true})"
+                       : "{}");
+        long long resumeTime = 77;
+        EXPECT_TRUE(StatusMgr::GetPauseInfo(resumeTime));
+        EXPECT_EQ(resumeTime, marked ? 0 : -1);
+        EXPECT_EQ(StatusMgr::ShareIsNoSpace("a"), marked);
+        EXPECT_EQ(StatusMgr::ShareIsNeedReindex("a"), marked);
+        EXPECT_EQ(StatusMgr::IsUpdated("step"), marked);
+    }
+}
+
 } // namespace
 
 } // namespace VANO::TESTS

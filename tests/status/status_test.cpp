@@ -80,6 +80,26 @@ TEST_F(StatusTest, AFailedSaveIsReported) {
     ExpectLog({"config:38 Failed to save json to /usr/vano/etc/fileindex/status.conf"});
 }
 
+TEST_F(StatusTest, ChangesStayInMemoryUntilTheyAreSaved) {
+    const std::string before = R"({"resume_time":5})";
+    PutFile(kStatusFile, before);
+    Fault::Count(Call::Flock);
+    {
+        Status changed;
+        EXPECT_TRUE(changed.Load());
+        EXPECT_TRUE(changed.Pause(0));
+        EXPECT_TRUE(changed.ShareSetNoSpace("a", true));
+        EXPECT_TRUE(changed.ShareSetNoSpace("b", false));
+        EXPECT_TRUE(changed.ShareSetNeedReindex("a", true));
+        EXPECT_TRUE(changed.SetUpdated("step"));
+        EXPECT_TRUE(changed.Resume());
+        EXPECT_EQ(ReadText(kStatusFile), before);
+    }
+    EXPECT_EQ(ReadText(kStatusFile), before) << "saved by the destructor";
+    EXPECT_EQ(Fault::Calls(Call::Flock), 0U);
+    EXPECT_FALSE(Exists(kStatusLock));
+}
+
 TEST_F(StatusTest, PauseStoresTheTimeAs64Bits) {
     for (const long long time :
          {0LL, 1LL, -7LL, 9223372036854775807LL, -9223372036854775807LL - 1}) {
@@ -156,6 +176,13 @@ TEST_F(StatusTest, UnmarkingRemovesOnlyThatShare) {
     EXPECT_TRUE(status.ShareSetNoSpace("a", false));
     EXPECT_TRUE(status.ShareSetNeedReindex("b", false));
     EXPECT_EQ(status.root, Json(R"({"no_space":{"b":true},"need_reindex":{"a":true}})"));
+}
+
+TEST_F(StatusTest, UnmarkingTheLastShareLeavesAnEmptyMember) {
+    status.root = Json(R"({"no_space":{"a":true},"need_reindex":{"a":true}})");
+    EXPECT_TRUE(status.ShareSetNoSpace("a", false));
+    EXPECT_TRUE(status.ShareSetNeedReindex("a", false));
+    EXPECT_EQ(status.root, Json(R"({"no_space":{},"need_reindex":{}})"));
 }
 
 TEST_F(StatusTest, UnmarkingWhatWasNeverMarkedLeavesNoMember) {

@@ -155,7 +155,7 @@ TEST_F(EventQueueTest, WritesOnceUnderTheLock) {
                     "close(" + queue + ")"));
     const long flags = Fault::Log(Call::Open)[0].number;
     EXPECT_EQ(flags & O_ACCMODE, O_WRONLY);
-    for (const int flag : {O_APPEND, O_CREAT, O_NOFOLLOW, O_NONBLOCK, O_CLOEXEC}) {
+    for (const int flag : {O_APPEND, O_CREAT, O_NOFOLLOW, O_NONBLOCK, O_NOCTTY, O_CLOEXEC}) {
         EXPECT_EQ(flags & flag, flag);
     }
     EXPECT_EQ(flags & O_TRUNC, 0);
@@ -500,6 +500,43 @@ TEST_F(EventQueueTest, TheLockErrorIsToldBeforeTheMark) {
                                        StartsWith("log: utils:507 flock fail, "),
                                        std::string("file: ") + kStatusFile));
     (void)SystemLog::Get().Lines();
+}
+
+TEST_F(EventQueueTest, ALockErrorAfterBusyLocksMarksTheShare) {
+    LOG_LEVEL = 7;
+    Fault::Quiet(Call::Usleep);
+    Fault::On(Call::Flock, [attempt = 0](CallInfo &info) mutable -> std::optional<long> {
+        if (info.path != kQueue) {
+            return std::nullopt;
+        }
+        errno = ++attempt < 3 ? EAGAIN : ENOLCK;
+        return -1;
+    });
+    EXPECT_FALSE(AddTrip());
+    EXPECT_EQ(Fault::Calls(Call::Usleep), 2U);
+    EXPECT_EQ(QueueCalls(Call::Flock), 3U);
+    EXPECT_EQ(ReadText(kQueue), "");
+    ExpectMark("photos");
+    ExpectLog(
+        {std::string("utils:507 flock fail, path=") + kQueue + ", reason=No locks available"});
+}
+
+TEST_F(EventQueueTest, AQueueThatCannotBeOpenedAgainMarksTheShareWithoutAMessage) {
+    LOG_LEVEL = 7;
+    Fault::Quiet(Call::Usleep);
+    FailQueueLock(1, EAGAIN);
+    Fault::On(Call::Open, [opened = 0](CallInfo &info) mutable -> std::optional<long> {
+        if (info.path != kQueue || ++opened == 1) {
+            return std::nullopt;
+        }
+        errno = EMFILE;
+        return -1;
+    });
+    EXPECT_FALSE(AddTrip());
+    EXPECT_EQ(QueueCalls(Call::Open), 2U);
+    EXPECT_EQ(ReadText(kQueue), "");
+    ExpectMark("photos");
+    ExpectLog({});
 }
 
 TEST_F(EventQueueTest, LockMessagesNeedExactlyLevelSeven) {

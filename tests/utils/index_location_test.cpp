@@ -117,21 +117,17 @@ TEST_P(IndexLocationTest, ABufferOfOneByteIsTheEmptyPath) {
 
 TEST_P(IndexLocationTest, BadArgumentsAreNamedInOrder) {
     const std::string noOut = std::string("__null != ") + GetParam().outName;
-    char out = 'x';
+    char out[2] = "x";
     const struct {
         const char *share;
         char *out;
         int size;
         std::string condition;
     } kRows[] = {
-        {nullptr, &out, 10, "__null != szName"},
-        {nullptr, nullptr, 0, "__null != szName"},
-        {"photos", nullptr, 10, noOut},
-        {"photos", nullptr, 0, noOut},
-        {"photos", &out, 0, "cbOutLen > 0"},
-        {"photos", &out, -1, "cbOutLen > 0"},
-        {"photos", &out, INT_MIN, "cbOutLen > 0"},
-        {"unknown", &out, 0, "cbOutLen > 0"},
+        {nullptr, out, 10, "__null != szName"},   {nullptr, nullptr, 0, "__null != szName"},
+        {"photos", nullptr, 10, noOut},           {"photos", nullptr, 0, noOut},
+        {"photos", out, 0, "cbOutLen > 0"},       {"photos", out, -1, "cbOutLen > 0"},
+        {"photos", out, INT_MIN, "cbOutLen > 0"}, {"unknown", out, 0, "cbOutLen > 0"},
     };
     for (const auto &row : kRows) {
         EventTrace::Get().Clear();
@@ -141,7 +137,7 @@ TEST_P(IndexLocationTest, BadArgumentsAreNamedInOrder) {
         EXPECT_EQ(Get(row.share, row.out, row.size), -1) << row.condition;
         EXPECT_THAT(platform.Trace(), ElementsAre("log: " + message, "VLIBCErrSetEx(0x0D00)"));
         EXPECT_EQ(platform.lastError, 0x0D00);
-        EXPECT_EQ(out, 'x');
+        EXPECT_STREQ(out, "x");
         ExpectLog({message});
         ExpectError(FILEINDEX_ERR_NONE);
     }

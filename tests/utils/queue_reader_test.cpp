@@ -202,7 +202,9 @@ TEST_F(QueueReaderTest, TheDescriptorIsNotInheritedAndIsClosed) {
     Fault::Count(Call::Close);
     { const QueueReader reader(kQueue); }
     ASSERT_EQ(Fault::Log(Call::Open).size(), 1U);
-    EXPECT_EQ(Fault::Log(Call::Open)[0].number & O_CLOEXEC, O_CLOEXEC);
+    for (const int flag : {O_NOFOLLOW, O_NONBLOCK, O_NOCTTY, O_CLOEXEC}) {
+        EXPECT_EQ(Fault::Log(Call::Open)[0].number & flag, flag) << flag;
+    }
     EXPECT_EQ(Fault::Calls(Call::Close), 1U);
 }
 
