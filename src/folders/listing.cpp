@@ -51,6 +51,22 @@ void Sort(std::vector<Folder> &folders, const std::string &sortBy) {
     SortByText(folders, sortBy == "name" ? &Folder::name : &Folder::path);
 }
 
+bool CollectAdditional(Json::Value &facts, const Folder &folder, const Json::Value &keys) {
+    if (!keys.isArray()) {
+        return RefuseKeys(97, keys);
+    }
+    for (const Json::Value &element : keys) {
+        if (!element.isString()) {
+            return RefuseKeys(104, element);
+        }
+        const std::string key = element.asString();
+        if (!folder.GetAdditional(facts[key], key)) {
+            LogError(kUnit, 110, "Failed to get additional: %s", key.c_str());
+        }
+    }
+    return true;
+}
+
 } // namespace
 
 bool Folder::GetAdditional(Json::Value &out, const std::string &key) const {
@@ -68,21 +84,10 @@ bool Folder::GetAdditional(Json::Value &out, const std::string &key) const {
 }
 
 bool Folder::GetAdditional(Json::Value &out, const Json::Value &keys) const {
-    const Json::Value wanted = keys; // may be what `out` holds
-    out = Json::Value(Json::objectValue);
-    if (!wanted.isArray()) {
-        return RefuseKeys(97, wanted);
-    }
-    for (const Json::Value &element : wanted) {
-        if (!element.isString()) {
-            return RefuseKeys(104, element);
-        }
-        const std::string key = element.asString();
-        if (!GetAdditional(out[key], key)) {
-            LogError(kUnit, 110, "Failed to get additional: %s", key.c_str());
-        }
-    }
-    return true;
+    Json::Value facts(Json::objectValue); // `keys` may be what `out` holds
+    const bool complete = CollectAdditional(facts, *this, keys);
+    out.swap(facts);
+    return complete;
 }
 
 Json::Value Folder::asJson(const Json::Value &additional) const {

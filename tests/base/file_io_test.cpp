@@ -426,6 +426,51 @@ TEST_F(FileIoTest, RoomForARewriteIsTakenBeforeTheOldTextIsTouched) {
     }
 }
 
+TEST_F(FileIoTest, AnEmptyTextIsWrittenInPlaceToo) {
+    ASSERT_EQ(::symlink("/volume1/target", kFile), 0);
+    PutFile("/volume1/target", "old");
+    EXPECT_TRUE(WriteFile(kFile, ""));
+    EXPECT_EQ(ReadText("/volume1/target"), "");
+}
+
+TEST_F(FileIoTest, NothingIsRemovedAfterASuccess) {
+    PutFile(kFile, "old");
+    Fault::Count(Call::Unlink);
+    EXPECT_TRUE(WriteFile(kFile, "new"));
+    EXPECT_EQ(Fault::Calls(Call::Unlink), 0U);
+}
+
+TEST_F(FileIoTest, AFailureIsToldWhateverClosingSays) {
+    Fault::Fail(Call::Fsync, ENOSPC);
+    Fault::On(Call::Close, [](CallInfo &) -> std::optional<long> {
+        errno = EIO;
+        return std::nullopt;
+    });
+    errno = 0;
+    EXPECT_FALSE(WriteFile(kFile, "new"));
+    EXPECT_EQ(errno, ENOSPC);
+}
+
+// A device in a settings file's place must neither block the caller nor become its terminal.
+TEST_F(FileIoTest, OpensWithoutBlockingAndWithoutTakingATerminal) {
+    PutFile("/volume1/target", "old");
+    ASSERT_EQ(::symlink("/volume1/target", kFile), 0);
+    std::string text;
+    Fault::Count(Call::Open);
+    EXPECT_TRUE(ReadFile(text, kFile, 100));
+    EXPECT_TRUE(WriteFile(kFile, "new"));
+    std::size_t opened = 0;
+    for (const CallInfo &info : Fault::Log(Call::Open)) {
+        if (info.path == kFile) {
+            ++opened;
+            for (const int flag : {O_NONBLOCK, O_NOCTTY, O_CLOEXEC}) {
+                EXPECT_EQ(info.number & flag, flag);
+            }
+        }
+    }
+    EXPECT_GE(opened, 2U);
+}
+
 TEST_F(FileIoTest, AnInterruptedReservationIsTriedAgain) {
     ASSERT_EQ(::symlink("/volume1/target", kFile), 0);
     PutFile("/volume1/target", "old");
