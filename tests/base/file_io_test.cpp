@@ -440,6 +440,18 @@ TEST_F(FileIoTest, NothingIsRemovedAfterASuccess) {
     EXPECT_EQ(Fault::Calls(Call::Unlink), 0U);
 }
 
+TEST_F(FileIoTest, TheFirstDescriptorIsClosedLikeAnyOther) {
+    PutFile(kFile, "text");
+    const int input = ::dup(STDIN_FILENO);
+    ASSERT_GE(input, 0);
+    ASSERT_EQ(::close(STDIN_FILENO), 0);
+    std::string text;
+    EXPECT_TRUE(ReadFile(text, kFile, 100));
+    EXPECT_EQ(::fcntl(STDIN_FILENO, F_GETFD), -1) << "what a program without input opens first";
+    EXPECT_EQ(::dup2(input, STDIN_FILENO), STDIN_FILENO);
+    EXPECT_EQ(::close(input), 0);
+}
+
 TEST_F(FileIoTest, AFailureIsToldWhateverClosingSays) {
     Fault::Fail(Call::Fsync, ENOSPC);
     Fault::On(Call::Close, [](CallInfo &) -> std::optional<long> {
