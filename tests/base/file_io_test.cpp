@@ -440,6 +440,16 @@ TEST_F(FileIoTest, NothingIsRemovedAfterASuccess) {
     EXPECT_EQ(Fault::Calls(Call::Unlink), 0U);
 }
 
+TEST_F(FileIoTest, AFailureIsToldWhateverRemovingTheTemporaryFileSays) {
+    Fault::Fail(Call::Fsync, ENOSPC);
+    Fault::On(Call::Unlink, [](CallInfo &) -> std::optional<long> {
+        errno = EIO;
+        return std::nullopt;
+    });
+    EXPECT_FALSE(WriteFile(kFile, "new"));
+    EXPECT_EQ(errno, ENOSPC);
+}
+
 TEST_F(FileIoTest, TheFirstDescriptorIsClosedLikeAnyOther) {
     PutFile(kFile, "text");
     const int input = ::dup(STDIN_FILENO);
