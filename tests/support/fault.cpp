@@ -31,10 +31,10 @@ namespace {
 constexpr std::size_t kCallCount = static_cast<std::size_t>(Call::Count_);
 
 constexpr std::array<const char *, kCallCount> kNames = {
-    "chmod", "close", "connect",   "fallocate", "fchmod",     "fchown",   "flock",
-    "fstat", "fsync", "ftruncate", "lstat",     "mkdir",      "mkostemp", "open",
-    "rand",  "read",  "realpath",  "rename",    "setsockopt", "signal",   "socket",
-    "stat",  "time",  "unlink",    "usleep",    "write"};
+    "chmod",     "close", "connect",   "fallocate", "fchmod", "fchown",     "flock",
+    "fstat",     "fsync", "ftruncate", "lstat",     "mkdir",  "mkostemp",   "open",
+    "open_path", "rand",  "read",      "realpath",  "rename", "setsockopt", "signal",
+    "socket",    "stat",  "time",      "unlink",    "usleep", "write"};
 
 struct Rules {
     std::shared_ptr<Fault::Hook> hook; // shared, so that a hook with a counter keeps counting
@@ -130,6 +130,7 @@ std::string CallInfo::Text() const {
     case Call::Ftruncate:
     case Call::Mkdir:
     case Call::Open:
+    case Call::OpenPath:
         text += ", " + std::to_string(number);
         break;
     case Call::Setsockopt:
@@ -215,6 +216,22 @@ CallInfo OfPath(Call call, const char *path, long number = 0) {
     return info;
 }
 
+// The path of a call that takes one relative to a directory.
+CallInfo OfPathAt(Call call, int directory, const char *path, long number = 0) {
+    CallInfo info = OfPath(call, path, number);
+    if (directory != AT_FDCWD && info.path.compare(0, 1, "/") != 0) {
+        const KitScope kit;
+        const int reason = errno;
+        info.path = PathOf(directory) + "/" + info.path;
+        errno = reason;
+    }
+    return info;
+}
+
+Call KindOfOpen(int flags) {
+    return (flags & O_PATH) != 0 ? Call::OpenPath : Call::Open;
+}
+
 CallInfo OfFd(Call call, int fd, long number = 0) {
     CallInfo info{call, {}, {}};
     info.fd = fd;
@@ -237,9 +254,11 @@ using VANO::TESTS::Call;
 using VANO::TESTS::CallInfo;
 using VANO::TESTS::Enter;
 using VANO::TESTS::IsActive;
+using VANO::TESTS::KindOfOpen;
 using VANO::TESTS::Next;
 using VANO::TESTS::OfFd;
 using VANO::TESTS::OfPath;
+using VANO::TESTS::OfPathAt;
 using VANO::TESTS::PollBefore;
 
 // Tells a hook of the call; `return` with its result when it has one.
@@ -260,7 +279,8 @@ int open(const char *path, int flags, ...) {
     va_start(arguments, flags);
     const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
     va_end(arguments);
-    FILEINDEX_TELL(Call::Open, OfPath(Call::Open, path, flags), int)
+    const Call kind = KindOfOpen(flags);
+    FILEINDEX_TELL(kind, OfPath(kind, path, flags), int)
     return next(path, flags, mode);
 }
 
@@ -270,8 +290,31 @@ int open64(const char *path, int flags, ...) {
     va_start(arguments, flags);
     const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
     va_end(arguments);
-    FILEINDEX_TELL(Call::Open, OfPath(Call::Open, path, flags), int)
+    const Call kind = KindOfOpen(flags);
+    FILEINDEX_TELL(kind, OfPath(kind, path, flags), int)
     return next(path, flags, mode);
+}
+
+int openat64(int directory, const char *path, int flags, ...) {
+    static const auto next = Next<int (*)(int, const char *, int, ...)>("openat64");
+    va_list arguments;
+    va_start(arguments, flags);
+    const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
+    va_end(arguments);
+    const Call kind = KindOfOpen(flags);
+    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path, flags), int)
+    return next(directory, path, flags, mode);
+}
+
+int openat(int directory, const char *path, int flags, ...) {
+    static const auto next = Next<int (*)(int, const char *, int, ...)>("openat");
+    va_list arguments;
+    va_start(arguments, flags);
+    const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
+    va_end(arguments);
+    const Call kind = KindOfOpen(flags);
+    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path, flags), int)
+    return next(directory, path, flags, mode);
 }
 
 int close(int fd) {
@@ -362,6 +405,12 @@ int mkdir(const char *path, mode_t mode) __THROW {
     return next(path, mode);
 }
 
+int mkdirat(int directory, const char *path, mode_t mode) __THROW {
+    static const auto next = Next<int (*)(int, const char *, mode_t)>("mkdirat");
+    FILEINDEX_TELL(Call::Mkdir, OfPathAt(Call::Mkdir, directory, path, mode), int)
+    return next(directory, path, mode);
+}
+
 int mkostemp(char *path, int flags) {
     static const auto next = Next<int (*)(char *, int)>("mkostemp");
     FILEINDEX_TELL(Call::Mkostemp, OfPath(Call::Mkostemp, path, flags), int)
@@ -422,6 +471,20 @@ int lstat64(const char *path, struct stat64 *info) __THROW {
     return next(path, info);
 }
 
+int fstatat64(int directory, const char *path, struct stat64 *info, int flags) __THROW {
+    static const auto next = Next<int (*)(int, const char *, struct stat64 *, int)>("fstatat64");
+    const Call kind = (flags & AT_SYMLINK_NOFOLLOW) != 0 ? Call::Lstat : Call::Stat;
+    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path), int)
+    return next(directory, path, info, flags);
+}
+
+int fstatat(int directory, const char *path, struct stat *info, int flags) __THROW {
+    static const auto next = Next<int (*)(int, const char *, struct stat *, int)>("fstatat");
+    const Call kind = (flags & AT_SYMLINK_NOFOLLOW) != 0 ? Call::Lstat : Call::Stat;
+    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path), int)
+    return next(directory, path, info, flags);
+}
+
 int fstat(int fd, struct stat *info) __THROW {
     static const auto next = Next<int (*)(int, struct stat *)>("fstat");
     FILEINDEX_TELL(Call::Fstat, OfFd(Call::Fstat, fd), int)
@@ -445,7 +508,7 @@ char *realpath(const char *path, char *resolved) __THROW {
     return next(path, resolved);
 }
 
-// What a fortified build calls instead of read, realpath and open.
+// What a fortified build calls instead of read, realpath, open and openat.
 ssize_t __read_chk(int fd, void *buffer, size_t size, size_t room);
 ssize_t __read_chk(int fd, void *buffer, size_t size, size_t) {
     return read(fd, buffer, size);
@@ -464,6 +527,16 @@ int __open_2(const char *path, int flags) {
 int __open64_2(const char *path, int flags);
 int __open64_2(const char *path, int flags) {
     return open64(path, flags);
+}
+
+int __openat_2(int directory, const char *path, int flags);
+int __openat_2(int directory, const char *path, int flags) {
+    return openat(directory, path, flags);
+}
+
+int __openat64_2(int directory, const char *path, int flags);
+int __openat64_2(int directory, const char *path, int flags) {
+    return openat64(directory, path, flags);
 }
 
 int socket(int domain, int type, int protocol) __THROW {

@@ -18,7 +18,8 @@
 //     Fault::Quiet(Call::Usleep);                   // succeeds without doing anything
 //     EXPECT_EQ(Fault::Calls(Call::Open), 3U);      // counted while anything is set for the call
 //
-// The variants of one call (open and open64, and so on) count as one. Calls by the test kit itself
+// The variants of one call (open, open64 and openat, and so on) count as one, but for opens with
+// O_PATH, which open nothing that can be read or written. Calls by the test kit itself
 // are left alone, those by the test's own code are not: set faults right before the call under
 // test. The fixture resets everything.
 
@@ -44,6 +45,7 @@ enum class Call {
     Mkdir,
     Mkostemp,
     Open,
+    OpenPath,
     Rand,
     Read,
     Realpath,
