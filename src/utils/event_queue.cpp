@@ -15,6 +15,7 @@
 #include "config/lock_retry.h"
 #include "config/paths.h"
 #include "utils/event_codes.h"
+#include "utils/metadata_entry.h"
 #include "utils/queue_reader.h"
 #include "utils/share_location.h"
 #include "utils/share_of_full_path.h"
@@ -57,13 +58,12 @@ bool IsPathReindexQueued(const std::string &fullPath, const std::string &queueFi
     return false;
 }
 
-// Users can write beside the queue: nothing but a regular file of that very name is appended to.
-UniqueFd OpenQueue(const std::string &queueFile) {
-    UniqueFd queue(::open(
-        queueFile.c_str(),
-        O_WRONLY | O_APPEND | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC, 0666));
+// Users can write beside the queue. Only a regular file is appended to, and none that has a second
+// name: it may be somebody else's file.
+UniqueFd OpenQueue(const MetadataEntry &entry) {
+    UniqueFd queue = entry.Open(O_WRONLY | O_APPEND | O_CREAT, 0666);
     struct stat info {};
-    if (!queue || ::fstat(queue.Get(), &info) != 0 || !S_ISREG(info.st_mode)) {
+    if (!queue || ::fstat(queue.Get(), &info) != 0 || !S_ISREG(info.st_mode) || info.st_nlink > 1) {
         return UniqueFd();
     }
     return queue;
@@ -71,10 +71,10 @@ UniqueFd OpenQueue(const std::string &queueFile) {
 
 // Between opening the queue and locking it the daemon may have taken it over: what is written to
 // that file then is lost.
-bool IsTakenOver(const UniqueFd &queue, const std::string &queueFile) {
+bool IsTakenOver(const UniqueFd &queue, const MetadataEntry &entry) {
     struct stat opened {};
     struct stat named {};
-    return ::fstat(queue.Get(), &opened) != 0 || ::lstat(queueFile.c_str(), &named) != 0 ||
+    return ::fstat(queue.Get(), &opened) != 0 || !entry.Stat(named) ||
            opened.st_dev != named.st_dev || opened.st_ino != named.st_ino;
 }
 
@@ -90,7 +90,8 @@ void WriteAndUnlock(const UniqueFd &queue, const std::string &line) {
 enum class Append { kDone, kBusy, kTakenOver, kFailed };
 
 Append TryToAppend(const std::string &queueFile, const std::string &line) {
-    const UniqueFd queue = OpenQueue(queueFile);
+    const MetadataEntry entry(queueFile);
+    const UniqueFd queue = OpenQueue(entry);
     if (!queue) {
         return Append::kFailed;
     }
@@ -104,7 +105,7 @@ Append TryToAppend(const std::string &queueFile, const std::string &line) {
         }
         return Append::kFailed;
     }
-    if (IsTakenOver(queue, queueFile)) {
+    if (IsTakenOver(queue, entry)) {
         return Append::kTakenOver;
     }
     WriteAndUnlock(queue, line);

@@ -9,6 +9,7 @@
 
 #include "base/log.h"
 #include "config/paths.h"
+#include "utils/metadata_entry.h"
 #include "utils/share_record.h"
 
 namespace VANO::FILEINDEX {
@@ -69,6 +70,15 @@ ShareRecord WriteLocation(const Location &location, const char *shareName, char 
     return share;
 }
 
+// Users can write to the share: nothing is made behind a symbolic link. A path that was cut to the
+// caller's buffer names no place in the metadata directory any more; it is made as it stands.
+bool MakeDatabase(const std::string &path) {
+    static const std::string kWhole = std::string("/") + kMetadataDirName + "/" + kIndexDbName;
+    const bool isWhole = path.size() >= kWhole.size() &&
+                         path.compare(path.size() - kWhole.size(), kWhole.size(), kWhole) == 0;
+    return isWhole ? MetadataEntry(path).MakeDirectory(0777) : ::mkdir(path.c_str(), 0777) == 0;
+}
+
 } // namespace
 
 } // namespace VANO::FILEINDEX
@@ -80,7 +90,7 @@ int FILEIDXDBPathGet(const char *szName, char *szOutDBPath, int cbOutLen) {
     if (!share) {
         return -1;
     }
-    if (::mkdir(szOutDBPath, 0777) != 0 && errno != EEXIST) {
+    if (!MakeDatabase(szOutDBPath) && errno != EEXIST) {
         LogError(kUnit, 750, "mkdir failed, path=%s, reason=%s", szOutDBPath, ErrnoText().c_str());
     }
     return static_cast<int>(std::strlen(szOutDBPath));

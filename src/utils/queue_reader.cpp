@@ -7,6 +7,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "utils/metadata_entry.h"
+
 namespace VANO::FILEINDEX {
 
 namespace {
@@ -18,8 +20,7 @@ constexpr char kCutMark[] = "...";
 
 } // namespace
 
-QueueReader::QueueReader(const std::string &path)
-    : file_(::open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC)) {
+QueueReader::QueueReader(const std::string &path) : file_(MetadataEntry(path).Open(O_RDONLY)) {
     struct stat info {};
     if (file_ && (::fstat(file_.Get(), &info) != 0 || !S_ISREG(info.st_mode))) {
         file_ = UniqueFd();

@@ -22,7 +22,7 @@ struct QueueEvent {
 // ends at 64 MiB: a longer line is cut there and is then no event.
 class QueueReader {
   public:
-    // Opens the queue, a regular file; a symbolic link in its place is not followed.
+    // Opens a share's queue, a regular file; no symbolic link in the share is followed to it.
     explicit QueueReader(const std::string &path);
 
     // Whether the queue could be opened; errno says why not.

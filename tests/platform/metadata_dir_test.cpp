@@ -38,6 +38,20 @@ TEST_F(MetadataDirTest, RefusesALinkToADirectory) {
     EXPECT_EQ(kErrNotADirectory, VLIBCErrGet());
 }
 
+TEST_F(MetadataDirTest, MakesNothingBehindALink) {
+    MakeDirs("/volume1/photos/elsewhere");
+    ASSERT_EQ(0, ::symlink("elsewhere", "/volume1/photos/share"));
+    EXPECT_LT(VANOEAMKDir(0, "/volume1/photos/share/@eaDir"), 0);
+    EXPECT_EQ(kErrMakeDir, VLIBCErrGet());
+    EXPECT_FALSE(Exists("/volume1/photos/elsewhere/@eaDir"));
+}
+
+TEST_F(MetadataDirTest, TakesAPathAsItIsWritten) {
+    EXPECT_EQ(0, VANOEAMKDir(0, "/volume1/photos//@eaDir/"));
+    EXPECT_TRUE(Exists(kDirectory));
+    EXPECT_EQ(0, VANOEAMKDir(0, "/volume1")) << "at the top";
+}
+
 TEST_F(MetadataDirTest, RefusesAFile) {
     PutFile(kDirectory, "");
     EXPECT_LT(VANOEAMKDir(0, kDirectory), 0);

@@ -148,11 +148,12 @@ TEST_F(EventQueueTest, WritesOnceUnderTheLock) {
         platform.Trace(),
         ElementsAre("VANOShareNamePathGet(/volume1/photos/trip, 492, 4096)", "VANOShareGet(photos)",
                     "VANOEAMKDir(0, /volume1/photos/@eaDir)", "VANOShareFree(photos)",
+                    "close(/volume1/photos)", // after the way to the queue was looked at
                     StartsWith("open(" + queue + ", "),
                     "flock(" + queue + ", " + std::to_string(LOCK_EX | LOCK_NB) + ")",
                     "write(" + queue + ", " + std::to_string(std::string(kTripLine).size()) + ")",
-                    "flock(" + queue + ", " + std::to_string(LOCK_UN) + ")",
-                    "close(" + queue + ")"));
+                    "flock(" + queue + ", " + std::to_string(LOCK_UN) + ")", "close(" + queue + ")",
+                    "close(/volume1/photos/@eaDir)"));
     const long flags = Fault::Log(Call::Open)[0].number;
     EXPECT_EQ(flags & O_ACCMODE, O_WRONLY);
     for (const int flag : {O_APPEND, O_CREAT, O_NOFOLLOW, O_NONBLOCK, O_NOCTTY, O_CLOEXEC}) {

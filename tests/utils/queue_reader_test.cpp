@@ -196,16 +196,20 @@ TEST_F(QueueReaderTest, OnlyARegularFileIsOpenedAndNothingBlocks) {
     expectRefused("a directory");
 }
 
-TEST_F(QueueReaderTest, TheDescriptorIsNotInheritedAndIsClosed) {
+TEST_F(QueueReaderTest, DescriptorsAreNotInheritedAndAreClosed) {
     PutFile(kQueue, "a\n");
     Fault::Count(Call::Open);
+    Fault::Count(Call::OpenPath);
     Fault::Count(Call::Close);
     { const QueueReader reader(kQueue); }
     ASSERT_EQ(Fault::Log(Call::Open).size(), 1U);
     for (const int flag : {O_NOFOLLOW, O_NONBLOCK, O_NOCTTY, O_CLOEXEC}) {
         EXPECT_EQ(Fault::Log(Call::Open)[0].number & flag, flag) << flag;
     }
-    EXPECT_EQ(Fault::Calls(Call::Close), 1U);
+    for (const CallInfo &directory : Fault::Log(Call::OpenPath)) {
+        EXPECT_EQ(directory.number & O_CLOEXEC, O_CLOEXEC) << directory.path;
+    }
+    EXPECT_EQ(Fault::Calls(Call::Close), 1U + Fault::Calls(Call::OpenPath));
 }
 
 // --- events ---------------------------------------------------------------------------------
