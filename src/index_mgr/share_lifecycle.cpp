@@ -9,6 +9,7 @@
 #include "index_mgr/services.h"
 #include "index_mgr/unit.h"
 #include "platform/vano_platform.h"
+#include "utils/metadata_entry.h"
 #include "utils/share_location.h"
 
 namespace VANO::FILEINDEX {
@@ -21,8 +22,14 @@ bool SendShareCommand(const char *command, const std::string &share) {
     return SendCammandToDaemon(command, parameters);
 }
 
-// What cannot be removed stays; that is no failure.
+// What cannot be removed stays; that is no failure. Behind a symbolic link lies another share's
+// data, or worse.
 void RemoveRecursively(const std::string &path) {
+    if (MetadataEntry(path).IsObstructed()) {
+        LogError(kIndexMgrUnit, __LINE__, "Refused to remove, not in the share, path=%s",
+                 path.c_str());
+        return;
+    }
     const char *const end = nullptr;
     (void)VLIBCExec(kRemoveToolPath, "-rf", path.c_str(), end, end);
 }
