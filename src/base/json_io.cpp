@@ -3,6 +3,7 @@
 #include <cerrno>
 #include <json/reader.h>
 #include <json/writer.h>
+#include <sstream>
 
 #include "base/file_io.h"
 
@@ -95,7 +96,11 @@ bool JsonToFile(const Json::Value &value, const std::string &path) {
 }
 
 std::string JsonToString(const Json::Value &value) {
-    return Json::writeString(WriterSettings(), value);
+    std::ostringstream text;
+    text.exceptions(std::ios::badbit); // without memory it would just end early
+    const std::unique_ptr<Json::StreamWriter> writer(WriterSettings().newStreamWriter());
+    writer->write(value, &text);
+    return text.str();
 }
 
 std::string JsonToMessageText(const Json::Value &value) {

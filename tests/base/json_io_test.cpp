@@ -6,6 +6,7 @@
 #include <unistd.h>
 
 #include "support/fixture.h"
+#include "support/memory_fault.h"
 #include "support/mounts.h"
 
 namespace VANO::TESTS {
@@ -117,6 +118,24 @@ TEST_F(JsonIoTest, TextIsCompactOnOneLineWithoutNewline) {
               R"({"a":{"c":true,"d":null},"b":[1,2]})");
     EXPECT_EQ(JsonToString(Json::Value(Json::objectValue)), "{}");
     EXPECT_EQ(JsonToString(Json::Value()), "null");
+}
+
+TEST_F(JsonIoTest, ATextForWhichThereIsNoMemoryIsNotCutShort) {
+    Json::Value value(Json::objectValue);
+    value["name"] = std::string(5000, 'x');
+    const std::string whole = JsonToString(value);
+    long requests = 1;
+    for (long refused = 1; refused <= requests; ++refused) {
+        std::string text = whole;
+        ArmMemoryFault({refused, false});
+        try {
+            text = JsonToString(value);
+        } catch (const std::exception &) {
+        }
+        requests = DisarmMemoryFault();
+        EXPECT_TRUE(text == whole) << "refused " << refused << ": " << text.size() << " bytes";
+    }
+    EXPECT_GT(requests, 1);
 }
 
 TEST_F(JsonIoTest, NewlinesInAStringAreEscaped) {
