@@ -8,6 +8,7 @@
 #include <sys/stat.h>
 
 #include "base/log.h"
+#include "base/no_throw.h"
 #include "config/paths.h"
 #include "utils/metadata_entry.h"
 #include "utils/share_record.h"
@@ -86,17 +87,22 @@ bool MakeDatabase(const std::string &path) {
 using namespace VANO::FILEINDEX;
 
 int FILEIDXDBPathGet(const char *szName, char *szOutDBPath, int cbOutLen) {
-    const ShareRecord share = WriteLocation(kDatabase, szName, szOutDBPath, cbOutLen);
-    if (!share) {
-        return -1;
-    }
-    if (!MakeDatabase(szOutDBPath) && errno != EEXIST) {
-        LogError(kUnit, 750, "mkdir failed, path=%s, reason=%s", szOutDBPath, ErrnoText().c_str());
-    }
-    return static_cast<int>(std::strlen(szOutDBPath));
+    return NoThrow(-1, [&] {
+        const ShareRecord share = WriteLocation(kDatabase, szName, szOutDBPath, cbOutLen);
+        if (!share) {
+            return -1;
+        }
+        if (!MakeDatabase(szOutDBPath) && errno != EEXIST) {
+            LogError(kUnit, 750, "mkdir failed, path=%s, reason=%s", szOutDBPath,
+                     ErrnoText().c_str());
+        }
+        return static_cast<int>(std::strlen(szOutDBPath));
+    });
 }
 
 int FILEIDXQueuePathGet(const char *szName, char *szOutQueuePath, int cbOutLen) {
-    const ShareRecord share = WriteLocation(kQueue, szName, szOutQueuePath, cbOutLen);
-    return share ? static_cast<int>(std::strlen(szOutQueuePath)) : -1;
+    return NoThrow(-1, [&] {
+        const ShareRecord share = WriteLocation(kQueue, szName, szOutQueuePath, cbOutLen);
+        return share ? static_cast<int>(std::strlen(szOutQueuePath)) : -1;
+    });
 }

@@ -694,7 +694,7 @@ TEST_F(UpsertTest, AnotherWriterIsRefusedMeanwhile) {
 TEST_F(UpsertTest, AnExceptionReleasesTheLock) {
     const DaemonPeer daemon;
     for (const char *function : {"VANOShareGet", "MonitorQueue::Upsert", "VLIBServiceStart",
-                                 "VANOSMBSetSpotlight", "VANOShareNamePathGet", "VANOEAMKDir"}) {
+                                 "VANOSMBSetSpotlight", "VANOShareNamePathGet"}) {
         SCOPED_TRACE(function);
         platform.Reset();
         platform.AddShare("photos", kPhotos);
@@ -705,6 +705,20 @@ TEST_F(UpsertTest, AnExceptionReleasesTheLock) {
         EXPECT_FALSE(IsLocked(kFolderLock));
         EXPECT_EQ(platform.LiveRecords(), 0U);
     }
+}
+
+// The queue's location is asked of an entry point for C, which lets nothing out.
+TEST_F(UpsertTest, AnExceptionBelowAnEntryPointForCIsAFailure) {
+    const DaemonPeer daemon;
+    platform.AddShare("photos", kPhotos);
+    platform.On("VANOEAMKDir", [](const std::string &) -> std::optional<int> {
+        throw std::runtime_error("the platform fails");
+    });
+    EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a"}])")));
+    ExpectLog({"index_mgr:24 FILEIDXQueuePathGet failed, share=photos",
+               "index_mgr:96 UpsertVANtifydCfg failed, share=photos"});
+    EXPECT_FALSE(IsLocked(kFolderLock));
+    EXPECT_EQ(platform.LiveRecords(), 0U);
 }
 
 TEST_F(UpsertTest, TheLockIsTakenOncePerCall) {

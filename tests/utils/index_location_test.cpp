@@ -3,6 +3,7 @@
 #include <fileindex/fileindex.h>
 
 #include "support/fixture.h"
+#include "support/memory_fault.h"
 
 #include <climits>
 #include <cstring>
@@ -230,6 +231,18 @@ TEST_F(DatabaseLocationTest, TheDirectoryHasTheModeThatTheUmaskLeaves) {
         EXPECT_GT(FILEIDXDBPathGet("photos", buffer, sizeof(buffer)), 0);
         EXPECT_EQ(ModeOf(database), 0777U & ~mask);
     }
+}
+
+TEST_F(DatabaseLocationTest, WithoutMemoryForTheMessageTheAnswerIsTheFailureValue) {
+    Fault::On(Call::Mkdir, [](CallInfo &) {
+        ArmMemoryFault({1, false});
+        errno = ENOENT;
+        return std::optional<long>(-1);
+    });
+    int result = 0;
+    EXPECT_NO_THROW(result = FILEIDXDBPathGet("photos", buffer, sizeof(buffer)));
+    EXPECT_GT(DisarmMemoryFault(), 0);
+    EXPECT_EQ(result, -1);
 }
 
 TEST_F(DatabaseLocationTest, WhateverExistsThereIsFine) {
