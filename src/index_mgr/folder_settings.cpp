@@ -11,6 +11,7 @@
 #include "base/json_io.h"
 #include "base/log.h"
 #include "config/settings_lock.h"
+#include "index_mgr/membership.h"
 #include "index_mgr/services.h"
 #include "index_mgr/unit.h"
 #include "utils/event_codes.h"
@@ -161,10 +162,15 @@ bool DropShare(const std::string &share) {
     return true;
 }
 
-// Rewrites the monitor configuration of the shares that still have folders and drops the others.
+// Rewrites the monitor configuration of the shares that still have folders and drops the others. A
+// query would answer no for settings that cannot be read: nothing may be dropped on that word.
 bool SettleShares(const std::set<std::string> &shares) {
     for (const std::string &share : shares) {
-        if (!IndexMgr::IsShareIndexed(share)) {
+        std::vector<Folder> left;
+        if (!IndexMgr::List(left)) {
+            return false;
+        }
+        if (!HoldsFolderOfShare(left, share)) {
             if (!DropShare(share)) {
                 return false;
             }

@@ -4,10 +4,11 @@
 #include <fileindex/share_path.h>
 
 #include <algorithm>
-#include <exception>
 
 #include "base/log.h"
+#include "base/no_throw.h"
 #include "folders/full_path_of.h"
+#include "index_mgr/membership.h"
 #include "index_mgr/unit.h"
 #include "utils/contains.h"
 
@@ -28,25 +29,31 @@ bool MayMeet(const std::string &asked, const std::string &stored) {
 // throws.
 template <typename Query>
 bool AskSettings(Query query) {
-    try {
+    return NoThrow(false, [&] {
         std::vector<Folder> folders;
         return IndexMgr::List(folders) && query(folders);
-    } catch (const std::exception &) {
-        return false;
-    }
+    });
 }
 
 // The same for a caller in C.
 template <typename Query>
 int AskFor(const char *what, Query query) {
-    try {
-        return what != nullptr && query(std::string(what)) ? 1 : 0;
-    } catch (const std::exception &) {
-        return 0;
-    }
+    return NoThrow(0, [&] { return what != nullptr && query(std::string(what)) ? 1 : 0; });
 }
 
 } // namespace
+
+bool HoldsFolderOfShare(const std::vector<Folder> &folders, const std::string &share) {
+    return std::any_of(folders.begin(), folders.end(), [&](const Folder &folder) {
+        std::string shareOfFolder;
+        if (!GetShareNameByPath(shareOfFolder, folder.path)) {
+            LogError(kIndexMgrUnit, __LINE__, "Failed to get share name from path: %s",
+                     folder.path.c_str());
+            return false;
+        }
+        return shareOfFolder == share;
+    });
+}
 
 bool IndexMgr::List(std::vector<Folder> &folders) {
     Folders settings;
@@ -54,17 +61,8 @@ bool IndexMgr::List(std::vector<Folder> &folders) {
 }
 
 bool IndexMgr::IsShareIndexed(const std::string &share) {
-    return AskSettings([&](const std::vector<Folder> &folders) {
-        return std::any_of(folders.begin(), folders.end(), [&](const Folder &folder) {
-            std::string shareOfFolder;
-            if (!GetShareNameByPath(shareOfFolder, folder.path)) {
-                LogError(kIndexMgrUnit, __LINE__, "Failed to get share name from path: %s",
-                         folder.path.c_str());
-                return false;
-            }
-            return shareOfFolder == share;
-        });
-    });
+    return AskSettings(
+        [&](const std::vector<Folder> &folders) { return HoldsFolderOfShare(folders, share); });
 }
 
 bool IndexMgr::IsPathIndexed(const std::string &path, const std::vector<Folder> &folders) {

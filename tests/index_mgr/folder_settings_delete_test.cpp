@@ -352,6 +352,7 @@ TEST_P(DeleteFailureTest, EndsTheOperationAndLeavesWhatWasDone) {
     std::vector<std::string> expected = AllSteps();
     expected.resize(row.steps);
     EXPECT_THAT(Steps(), ElementsAreArray(expected));
+    Fault::Reset();
     if (row.steps > 0) {
         EXPECT_THAT(StoredPaths(), ElementsAre("/photos/b"));
     }
@@ -448,6 +449,21 @@ INSTANTIATE_TEST_SUITE_P(
                     {"index_mgr:* MonitorQueue::Add failed",
                      "index_mgr:* UpsertVANotifydCfg failed, share=photos"},
                     FILEINDEX_ERR_NONE,
+                    0},
+        FailingStep{"SettingsUnreadableWhenTheSharesAreSettled",
+                    [](FakePlatform &) -> Obstacle {
+                        Fault::On(Call::Connect, [left = 2](CallInfo &) mutable {
+                            if (--left == 0) {
+                                Fault::FailPath(Call::Open, "folder.conf", EMFILE);
+                            }
+                            return std::optional<long>();
+                        });
+                        return nullptr;
+                    },
+                    true,
+                    4, // no index is removed on the word of settings that cannot be read
+                    {"config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf"},
+                    FILEINDEX_ERR_LOAD,
                     0},
         FailingStep{"ShareGoneBeforeItsIndexIsRemoved",
                     [](FakePlatform &platform) -> Obstacle {
