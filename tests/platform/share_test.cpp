@@ -2,9 +2,11 @@
 #include <cerrno>
 #include <chrono>
 #include <cstdio>
+#include <cstring>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <memory>
+#include <optional>
 #include <string>
 #include <sys/stat.h>
 #include <thread>
@@ -369,12 +371,26 @@ TEST_F(ShareTest, ALookupOfAnUnchangedTableIsOneStat) {
 
 TEST_F(ShareTest, APassingFailureToReadTheTableIsNotRemembered) {
     PutTable(R"({"photos":"/volume1/photos"})");
-    Fault::Fail(Call::Open, EMFILE);
+    for (const int error : {EMFILE, EIO, EACCES, EINTR, EAGAIN}) {
+        Fault::Fail(Call::Open, error);
+        EXPECT_EQ(kUnusable, Found("photos")) << error;
+        EXPECT_EQ("photos at /volume1/photos", Found("photos")) << error;
+        Fault::Reset();
+        ExpectLog({std::string("share_table:* share table cannot be read, path=") + kTable +
+                   ", reason=" + std::strerror(error)});
+        PutTable(R"({"photos":"/volume1/photos"})"); // another file, to be read anew
+    }
+}
+
+TEST_F(ShareTest, ATableThatWasReadInPartIsNotRemembered) {
+    PutTable(R"({"photos":"/volume1/photos"})");
+    Fault::On(Call::Read, [left = 1](CallInfo &) mutable {
+        return left-- > 0 ? std::optional<long>(0) : std::nullopt; // its end, far too early
+    });
     EXPECT_EQ(kUnusable, Found("photos"));
     EXPECT_EQ("photos at /volume1/photos", Found("photos"));
     Fault::Reset();
-    ExpectLog({std::string("share_table:* share table cannot be read, path=") + kTable +
-               ", reason=Too many open files"});
+    ExpectLog({std::string("share_table:* share table is not a JSON object, path=") + kTable});
 }
 
 TEST_F(ShareTest, AFailureToReadTheTableThatStaysIsLoggedOnce) {

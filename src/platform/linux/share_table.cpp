@@ -97,11 +97,6 @@ struct FileState {
     }
 };
 
-// Failures that say nothing of the file and may be gone at the next call.
-bool IsPassing(int error) {
-    return error == EMFILE || error == ENFILE || error == ENOMEM || error == EIO;
-}
-
 class ShareTableCache {
   public:
     std::shared_ptr<const ShareTable> Get() {
@@ -118,10 +113,12 @@ class ShareTableCache {
 
   private:
     std::shared_ptr<const ShareTable> Load(bool quiet) {
-        retry_ = true; // stands when there is no memory to load it
+        // Why a file that is there could not be loaded may be gone at the next call, be it for want
+        // of memory or of a descriptor: only a missing table is remembered.
+        retry_ = true;
         std::string text;
         if (!FILEINDEX::ReadFile(text, kShareTablePath, FILEINDEX::kMaxJsonFileBytes)) {
-            retry_ = IsPassing(errno);
+            retry_ = errno != ENOENT;
             if (!quiet) {
                 LogError(kUnit, __LINE__, "share table cannot be read, path=%s, reason=%s",
                          kShareTablePath, std::strerror(errno));
@@ -134,7 +131,6 @@ class ShareTableCache {
                 LogError(kUnit, __LINE__, "share table is not a JSON object, path=%s",
                          kShareTablePath);
             }
-            retry_ = false;
             return std::make_shared<const ShareTable>();
         }
         auto loaded = std::make_shared<const ShareTable>(table, quiet);
