@@ -28,3 +28,9 @@ string(REGEX REPLACE "/$" "" prefix_from_pkgconfig "${prefix_from_pkgconfig}")
 configure_file(cmake/fileindex.pc.in "${PROJECT_BINARY_DIR}/fileindex.pc" @ONLY)
 install(FILES "${PROJECT_BINARY_DIR}/fileindex.pc"
     DESTINATION "${CMAKE_INSTALL_LIBDIR}/pkgconfig")
+
+# docs/man/NAME.SECTION
+foreach(section IN ITEMS 1 3 5 7)
+    install(DIRECTORY docs/man/ DESTINATION "${CMAKE_INSTALL_MANDIR}/man${section}"
+        FILES_MATCHING PATTERN "*.${section}")
+endforeach()
