@@ -1,0 +1,77 @@
+// How much a process grows while it scans a queue of 1 GB.
+
+#include "bench/benchmarks.h"
+
+#include <array>
+#include <cstdio>
+#include <fileindex/status_mgr.h>
+#include <fstream>
+#include <memory>
+#include <sstream>
+#include <unistd.h>
+
+#include "bench/appliance.h"
+#include "bench/measure.h"
+
+namespace VANO::BENCH {
+
+namespace {
+
+constexpr std::size_t kMegabyte = 1'000'000;
+
+// A line of /proc/self/status, in bytes.
+std::size_t MemoryFigure(const std::string &name) {
+    std::ifstream status("/proc/self/status");
+    std::string word;
+    std::size_t kilobytes = 0;
+    while (status >> word) {
+        if (word == name + ":" && status >> kilobytes) {
+            return kilobytes * 1024;
+        }
+    }
+    throw std::runtime_error("the kernel does not tell " + name);
+}
+
+// From here on the peak is counted anew.
+void ResetPeak() {
+    std::ofstream("/proc/self/clear_refs") << '5';
+}
+
+// A process of its own, so that nothing that was freed before can be used again.
+double GrowthOfChild(const std::string &folder) {
+    const std::string command =
+        "exec /proc/" + std::to_string(::getpid()) + "/exe --peak-of '" + folder + "'";
+    const std::unique_ptr<FILE, int (*)(FILE *)> child(::popen(command.c_str(), "re"), ::pclose);
+    Require(child != nullptr, "cannot start a process");
+    std::array<char, 64> line{};
+    Require(std::fgets(line.data(), line.size(), child.get()) != nullptr,
+            "the process that scans failed");
+    return std::stod(line.data()) / kMegabyte;
+}
+
+double PeakMemory() {
+    const FilledQueue &queue = FillQueueTo(Size(1000, 16) * kMegabyte);
+    const double megabytes = GrowthOfChild(queue.idle.front());
+    RemoveQueues();
+    return megabytes;
+}
+
+} // namespace
+
+int PrintPeakOfScan(const std::string &folder) {
+    ResetPeak();
+    const std::size_t before = MemoryFigure("VmRSS");
+    const std::string status = FILEINDEX::StatusMgr::GetFolderStatus(folder);
+    const std::size_t peak = MemoryFigure("VmHWM");
+    Require(status == "finished", "wrong answer");
+    Require(peak >= before, "the peak was not counted anew");
+    (void)std::printf("%zu\n", peak - before);
+    return 0;
+}
+
+void AddMemoryBenchmarks() {
+    AddFigure({"peak_memory", "additional resident memory while a 1 GB queue is scanned", "MB", 16,
+               PeakMemory});
+}
+
+} // namespace VANO::BENCH
