@@ -55,7 +55,7 @@ int main(int argc, char **argv) {
     std::string queue;
     CLI::App app("Measures libfileindex side by side with what bounds it.");
     app.add_flag("--quick", options.quick, "small sizes: shows that everything runs");
-    app.add_flag("--cpu-time", options.cpuTime, "processor time instead of elapsed time");
+    app.add_flag("--wall", options.wall, "elapsed time instead of processor time");
     app.add_option("--filter", options.filter, "one key, or series");
     app.add_option("--json", options.json, "write the results to this file");
     app.add_option("--repetitions", options.repetitions, "repetitions of each comparison")

@@ -12,8 +12,8 @@
 namespace VANO::BENCH {
 
 struct Options {
-    bool quick = false;   // sizes that only show that everything runs
-    bool cpuTime = false; // the process's processor time instead of the time that passes
+    bool quick = false; // sizes that only show that everything runs
+    bool wall = false;  // the time that passes instead of the process's processor time
     std::size_t repetitions = 5;
     std::string filter; // one key, or "series"; empty for everything
     std::string json;   // file for the results; empty for none
@@ -27,8 +27,8 @@ std::size_t Size(std::size_t full, std::size_t quick);
 // Something that is timed. A wrong answer is no time: it ends the benchmark as an error.
 struct Operation {
     std::function<bool()> run;     // timed; false for a wrong answer
-    std::function<void()> prepare; // before each call of `run`, not timed; may be empty
-    std::function<bool()> check;   // after it, not timed; may be empty
+    std::function<void()> prepare; // before each sample, not timed; may be empty
+    std::function<bool()> check;   // after each sample, not timed; may be empty
 };
 
 struct Pair {
