@@ -3,6 +3,7 @@
 #include <fileindex/folders.h>
 #include <filesystem>
 #include <fstream>
+#include <json/writer.h>
 #include <limits>
 #include <sstream>
 #include <stdexcept>
@@ -75,6 +76,20 @@ const FilledQueue &Fill(std::size_t maxEvents, std::size_t maxBytes) {
     return Filled() = queue;
 }
 
+// For programs that run on the plain-Linux provider.
+void WriteShareTable() {
+    Json::Value table(Json::objectValue);
+    for (const auto &[name, directory] : ShareDirectories()) {
+        table[name] = directory;
+    }
+    std::ofstream file("/usr/vano/etc/shares.json");
+    file << table;
+    file.close();
+    if (!file) {
+        throw std::runtime_error("cannot write the share table");
+    }
+}
+
 } // namespace
 
 const std::map<std::string, std::string, std::less<>> &ShareDirectories() {
@@ -105,6 +120,7 @@ void MakeAppliance() {
     for (const auto &[name, directory] : ShareDirectories()) {
         fs::create_directories(directory + "/" + FILEINDEX::kMetadataDirName);
     }
+    WriteShareTable();
     RemoveSettings();
     RemoveQueues();
 }

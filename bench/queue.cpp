@@ -185,11 +185,13 @@ Pair AppendToEmptyQueue() {
     const std::string folder = FolderPaths(2).back();
     const std::string fullPath = FullPathOf(folder);
     const std::string file = QueueFileOf(folder.substr(1, folder.find('/', 1) - 1));
+    Require(AppendPlainly(file, ""), "cannot make a queue");
     const auto append = [=, data = ChangeReport()] {
         return AddCustomEvent(kEventSettingChanged, fullPath, data);
     };
-    Require(append(), "the event is not added");
-    const std::string line = ContentOf(file);
+    const std::string line =
+        R"({"data":{"audio":true,"document":true,"photo":true,"video":true},"event":131072,"path":")" +
+        fullPath + "\"}\n";
     const auto prepare = [=] { CutTo(file, 0); };
     const auto check = [=] { return ContentOf(file) == line; };
     return {{append, prepare, check}, {[=] { return AppendPlainly(file, line); }, prepare, check}};
