@@ -4,18 +4,22 @@
 
 #include <array>
 #include <cstdio>
+#include <fcntl.h>
 #include <fileindex/status_mgr.h>
 #include <fstream>
-#include <memory>
-#include <sstream>
+#include <stdexcept>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include "base/unique_fd.h"
 #include "bench/appliance.h"
 #include "bench/measure.h"
 
 namespace VANO::BENCH {
 
 namespace {
+
+using FILEINDEX::UniqueFd;
 
 constexpr std::size_t kMegabyte = 1'000'000;
 
@@ -37,14 +41,28 @@ void ResetPeak() {
     std::ofstream("/proc/self/clear_refs") << '5';
 }
 
+void ReplaceByScan(const UniqueFd &output, const std::string &folder) {
+    (void)::dup2(output.Get(), STDOUT_FILENO);
+    (void)::execl("/proc/self/exe", "fileindex_bench", "--peak-of", folder.c_str(), nullptr);
+    ::_exit(127);
+}
+
 // A process of its own, so that nothing that was freed before can be used again.
 double GrowthOfChild(const std::string &folder) {
-    const std::string command =
-        "exec /proc/" + std::to_string(::getpid()) + "/exe --peak-of '" + folder + "'";
-    const std::unique_ptr<FILE, int (*)(FILE *)> child(::popen(command.c_str(), "re"), ::pclose);
-    Require(child != nullptr, "cannot start a process");
+    std::array<int, 2> ends{};
+    Require(::pipe2(ends.data(), O_CLOEXEC) == 0, "cannot make a pipe");
+    const UniqueFd output(ends[0]);
+    UniqueFd input(ends[1]);
+    const pid_t child = ::fork();
+    Require(child >= 0, "cannot start a process");
+    if (child == 0) {
+        ReplaceByScan(input, folder);
+    }
+    input = UniqueFd();
     std::array<char, 64> line{};
-    Require(std::fgets(line.data(), line.size(), child.get()) != nullptr,
+    const ssize_t got = ::read(output.Get(), line.data(), line.size() - 1);
+    int status = 0;
+    Require(::waitpid(child, &status, 0) == child && status == 0 && got > 0,
             "the process that scans failed");
     return std::stod(line.data()) / kMegabyte;
 }

@@ -65,6 +65,23 @@ std::string Duration(double seconds) {
     return Text("%.2f us", seconds * 1e6);
 }
 
+void PrintRow(const KeyInfo &info, const Json::Value &entry) {
+    const bool isRatio = info.unit.empty();
+    const std::string unit = isRatio ? "" : " " + info.unit;
+    const double value = entry[isRatio ? "ratio" : info.unit].asDouble();
+    const std::string target =
+        (info.direction == Target::kAtMost ? "<= " : ">= ") + Text("%g", info.target) + unit;
+    (void)std::printf("%-20s %10s %10s  %-4s %12s %12s  %s\n", info.key.c_str(),
+                      (Text("%.3g", value) + unit).c_str(), target.c_str(),
+                      entry["met"].asBool() ? "yes" : "NO",
+                      isRatio ? Duration(entry["numerator_seconds"].asDouble()).c_str() : "",
+                      isRatio ? Duration(entry["denominator_seconds"].asDouble()).c_str() : "",
+                      info.text.c_str());
+    for (const auto &[name, fact] : info.facts) {
+        (void)std::printf("%20s %s\n", Text("%g", fact.value).c_str(), name.c_str());
+    }
+}
+
 double CounterOf(const benchmark::BenchmarkReporter::Run &run, const char *name) {
     const auto found = run.counters.find(name);
     return found != run.counters.end() ? found->second.value : std::nan("");
@@ -186,24 +203,12 @@ void Report::PrintTable() const {
     (void)std::printf("%-20s %10s %10s  %-4s %12s %12s  %s\n", "key", "measured", "target", "met",
                       "time", "against", "what");
     for (const KeyInfo &info : Keys()) {
-        if (!details_.isMember(info.key)) {
-            continue;
+        if (details_.isMember(info.key)) {
+            PrintRow(info, details_[info.key]);
         }
-        const Json::Value &entry = details_[info.key];
-        const bool isRatio = info.unit.empty();
-        const std::string unit = isRatio ? "" : " " + info.unit;
-        const double value = entry[isRatio ? "ratio" : info.unit].asDouble();
-        const std::string target =
-            (info.direction == Target::kAtMost ? "<= " : ">= ") + Text("%g", info.target) + unit;
-        (void)std::printf("%-20s %10s %10s  %-4s %12s %12s  %s\n", info.key.c_str(),
-                          (Text("%.3g", value) + unit).c_str(), target.c_str(),
-                          entry["met"].asBool() ? "yes" : "NO",
-                          isRatio ? Duration(entry["numerator_seconds"].asDouble()).c_str() : "",
-                          isRatio ? Duration(entry["denominator_seconds"].asDouble()).c_str() : "",
-                          info.text.c_str());
-        for (const auto &[name, fact] : info.facts) {
-            (void)std::printf("%20s %s\n", Text("%g", fact.value).c_str(), name.c_str());
-        }
+    }
+    if (GetOptions().quick) {
+        (void)std::puts("A quick run: sizes are smaller than said, and the figures mean nothing.");
     }
 }
 
