@@ -23,7 +23,7 @@ Examples:
 
 struct Options {
     std::string share;
-    bool json = false;
+    JsonMode json = JsonMode::kOff;
 };
 
 bool LiesIn(const std::string &share, const Json::Value &folder) {
@@ -53,11 +53,11 @@ ExitCode Run(const Options &options) {
             folders.append(folder);
         }
     }
-    if (options.json) {
+    if (options.json != JsonMode::kOff) {
         Json::Value answer(Json::objectValue);
         answer["folder"] = folders;
         answer["total"] = folders.size();
-        PrintJson(answer);
+        PrintJson(answer, options.json);
     } else if (!folders.empty()) {
         PrintTable(folders);
     }
@@ -77,7 +77,7 @@ ExitCode Run(const Options &options) {
 Action DeclareList(CLI::App &app) {
     const auto options = std::make_shared<Options>();
     app.add_option("--share", options->share, "Only the folders of this share")->type_name("SHARE");
-    app.add_flag("--json", options->json, "Answer with one JSON object");
+    AddJsonOption(app, options->json);
     app.footer(kFooter);
     return [options] { return Run(*options); };
 }

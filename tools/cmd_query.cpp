@@ -24,7 +24,7 @@ struct Options {
     std::vector<std::string> paths;
     bool isShare = false;
     bool isFullPath = false;
-    bool json = false;
+    JsonMode json = JsonMode::kOff;
 };
 
 bool IsIndexed(const std::string &path, const Options &options,
@@ -51,8 +51,8 @@ ExitCode Run(const Options &options) {
         answers[path] = isIndexed;
         result = isIndexed ? result : kNotFound;
     }
-    if (options.json) {
-        PrintJson(answers);
+    if (options.json != JsonMode::kOff) {
+        PrintJson(answers, options.json);
     } else {
         table.Print();
     }
@@ -79,7 +79,7 @@ Action DeclareQuery(CLI::App &app) {
     CLI::Option *share = app.add_flag("--share", options->isShare, "They are names of shares");
     app.add_flag("--full-path", options->isFullPath, "They are paths of the file system")
         ->excludes(share);
-    app.add_flag("--json", options->json, "Answer with one JSON object");
+    AddJsonOption(app, options->json);
     app.footer(kFooter);
     app.callback([options] {
         const std::string mistake = MistakeIn(*options);

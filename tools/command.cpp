@@ -13,6 +13,7 @@ Action DeclareCommands(CLI::App &app, const std::vector<Command> &table) {
     std::vector<std::pair<CLI::App *, Action>> actions;
     for (const Command &command : table) {
         CLI::App *subcommand = app.add_subcommand(command.name, command.summary);
+        subcommand->group("Commands");
         actions.emplace_back(subcommand, command.declare(*subcommand));
     }
     return [actions]() -> ExitCode {
@@ -23,6 +24,10 @@ Action DeclareCommands(CLI::App &app, const std::vector<Command> &table) {
         }
         return kUsage; // nobody gets here: one has been chosen
     };
+}
+
+void AddDryRunOption(CLI::App &app, bool &isDryRun) {
+    app.add_flag("--dry-run", isDryRun, "Only tell what would be done");
 }
 
 } // namespace CTL

@@ -13,6 +13,9 @@ enum ExitCode : int {
     kFailed = 1,   // it could not be done
     kUsage = 2,    // a mistake in the call; nothing was done
     kNotFound = 3, // not indexed, or nothing of that name; nothing was done
+    // As init scripts have it, for the commands that tell how the service is:
+    kPaused = 3,  // paused, or not running
+    kUnknown = 4, // that could not be told
 };
 
 using Action = std::function<ExitCode()>;
@@ -27,9 +30,12 @@ struct Command {
 // Makes the table's commands subcommands of `app`, one of which must be chosen; the result runs it.
 Action DeclareCommands(CLI::App &app, const std::vector<Command> &table);
 
+// The option --dry-run. `isDryRun` must outlive the parsing.
+void AddDryRunOption(CLI::App &app, bool &isDryRun);
+
 // One file each, cmd_<name>.cpp.
 Action DeclareAdd(CLI::App &app);
-Action DeclareGet(CLI::App &app);
+Action DeclareShow(CLI::App &app);
 Action DeclareList(CLI::App &app);
 Action DeclarePause(CLI::App &app);
 Action DeclareQuery(CLI::App &app);

@@ -1,8 +1,10 @@
 #include <csignal>
 #include <exception>
 #include <iostream>
+#include <memory>
 
 #include "command.h"
+#include "help.h"
 #include "messages.h"
 
 namespace {
@@ -10,7 +12,7 @@ namespace {
 const std::vector<CTL::Command> kCommands = {
     {"add", "Index folders, or index more of them", CTL::DeclareAdd},
     {"list", "Show the indexed folders", CTL::DeclareList},
-    {"get", "Show one indexed folder", CTL::DeclareGet},
+    {"show", "Show one indexed folder", CTL::DeclareShow},
     {"remove", "Stop indexing folders", CTL::DeclareRemove},
     {"reindex", "Index folders again from the start", CTL::DeclareReindex},
     {"pause", "Pause all indexing", CTL::DeclarePause},
@@ -38,6 +40,7 @@ std::string NameOf(const CLI::App &app) {
 int Run(int argc, char **argv) {
     CLI::App app("Manages the folders that the file-indexing service indexes.", "fileindexctl");
     app.footer(kFooter);
+    app.formatter(std::make_shared<CTL::HelpFormatter>());
     const CTL::Action action = CTL::DeclareCommands(app, kCommands);
     try {
         app.parse(argc, argv);

@@ -15,6 +15,27 @@ namespace {
 
 constexpr char kGap[] = "  ";
 
+// What CLI11 reads into a JsonMode: the number of the one that `word` names.
+std::string JsonModeNumber(const std::string &word) {
+    const std::pair<const char *, JsonMode> modes[] = {
+        {"off", JsonMode::kOff}, {"short", JsonMode::kShort}, {"pretty", JsonMode::kPretty}};
+    for (const auto &[name, mode] : modes) {
+        if (word == name) {
+            return std::to_string(static_cast<int>(mode));
+        }
+    }
+    throw CLI::ValidationError("it is short, pretty or off, not '" + Shown(word) + "'");
+}
+
+void PrintRow(const std::vector<std::string> &cells, const std::vector<std::size_t> &widths) {
+    for (std::size_t column = 0; column + 1 < cells.size(); ++column) {
+        std::cout << Padded(cells[column], widths[column]) << kGap;
+    }
+    std::cout << cells.back();
+}
+
+} // namespace
+
 bool IsTerminal() {
     return ::isatty(STDOUT_FILENO) == 1;
 }
@@ -26,14 +47,27 @@ bool MayUseColour() {
            std::string_view(terminal) != "dumb";
 }
 
-void PrintRow(const std::vector<std::string> &cells, const std::vector<std::size_t> &widths) {
-    for (std::size_t column = 0; column + 1 < cells.size(); ++column) {
-        std::cout << Padded(cells[column], widths[column]) << kGap;
-    }
-    std::cout << cells.back();
+void AddJsonOption(CLI::App &app, JsonMode &mode) {
+    // A flag, so that the word after a plain --json is not taken for its value.
+    CLI::Option *json =
+        app.add_flag("--json{short}", mode, "Answer in JSON: on one line (short), indented or not");
+    json->transform(JsonModeNumber)->type_name("short|pretty|off");
+    app.add_flag_callback(
+           "-j", [&mode] { mode = IsTerminal() ? JsonMode::kPretty : JsonMode::kShort; },
+           "Answer in JSON: pretty on a terminal, short elsewhere")
+        ->excludes(json);
 }
 
-} // namespace
+void PrintJson(const Json::Value &value, JsonMode mode) {
+    if (mode == JsonMode::kOff) {
+        return;
+    }
+    Json::StreamWriterBuilder builder;
+    builder["indentation"] = mode == JsonMode::kPretty ? "  " : "";
+    builder["enableYAMLCompatibility"] = mode == JsonMode::kPretty; // "key": value
+    builder["emitUTF8"] = true;
+    std::cout << Json::writeString(builder, value) << '\n';
+}
 
 void Table::Add(const std::vector<std::string> &cells) {
     std::vector<std::string> row;
@@ -63,13 +97,6 @@ void Table::Print() const {
         PrintRow(row, widths);
         std::cout << '\n';
     }
-}
-
-void PrintJson(const Json::Value &value) {
-    Json::StreamWriterBuilder builder;
-    builder["indentation"] = "";
-    builder["emitUTF8"] = true;
-    std::cout << Json::writeString(builder, value) << '\n';
 }
 
 } // namespace CTL

@@ -1,11 +1,26 @@
 #ifndef FILEINDEXCTL_OUTPUT_H
 #define FILEINDEXCTL_OUTPUT_H
 
+#include <CLI/CLI.hpp>
 #include <json/value.h>
 #include <string>
 #include <vector>
 
+// Standard output: where the answers go.
+
 namespace CTL {
+
+[[nodiscard]] bool IsTerminal();
+[[nodiscard]] bool MayUseColour(); // a terminal that knows colours, and nobody who asked for none
+
+enum class JsonMode { kOff, kShort, kPretty };
+
+// The options --json[=short|pretty|off] and -j, which is pretty on a terminal and short elsewhere.
+// `mode` must outlive the parsing.
+void AddJsonOption(CLI::App &app, JsonMode &mode);
+
+// Names come byte for byte, also those that are not UTF-8; nothing for kOff.
+void PrintJson(const Json::Value &value, JsonMode mode);
 
 // Rows of text under headings.
 class Table {
@@ -22,9 +37,6 @@ class Table {
     std::vector<std::string> headings_;
     std::vector<std::vector<std::string>> rows_;
 };
-
-// To standard output, on one line, names byte for byte.
-void PrintJson(const Json::Value &value);
 
 } // namespace CTL
 

@@ -1,8 +1,36 @@
 #include "paths.h"
 
+#include <array>
+#include <climits>
+#include <fileindex/error_handler.h>
+#include <fileindex/share_path.h>
+#include <vano_platform.h>
+
 #include "text.h"
 
 namespace CTL {
+
+namespace {
+
+namespace fileindex = VANO::FILEINDEX;
+
+// A question that was answered with no is no error that a later message should name.
+void ClearErrors() {
+    fileindex::ErrorHandler::SetError(fileindex::FILEINDEX_ERR_NONE);
+    VLIBCErrSetEx(0, "", 0);
+}
+
+// The name of the share that a full path lies in; empty when it lies in none. Asks the platform,
+// since the library would write every no into the system log.
+std::string ShareOfFullPath(const std::string &fullPath) {
+    std::array<char, NAME_MAX * 2> name{};
+    std::array<char, PATH_MAX> inside{};
+    const int result = VANOShareNamePathGet(fullPath.c_str(), name.data(), name.size(),
+                                            inside.data(), inside.size());
+    return result < 0 ? "" : name.data();
+}
+
+} // namespace
 
 CLI::Option *AddPathsTo(CLI::App &app, std::vector<std::string> &paths, const char *description) {
     return app.add_option("PATH", paths, description)->required();
@@ -32,6 +60,41 @@ std::string CheckFolderPath(const std::string &path) {
         }
     }
     return {};
+}
+
+bool ToSharePath(std::string &sharePath, const std::string &asked) {
+    if (asked.empty() || asked[0] != '/') {
+        return false;
+    }
+    std::string fullPath;
+    std::string converted = asked;
+    if (!fileindex::GetFullPath(fullPath, asked)) {
+        const std::string share = "/" + ShareOfFullPath(asked);
+        // What lies behind the share's directory, which this gives.
+        if (share.size() > 1 && fileindex::GetFullPath(fullPath, share) &&
+            fileindex::StringStartWith(asked + "/", fullPath + "/")) {
+            converted = share + asked.substr(fullPath.size());
+        }
+    }
+    ClearErrors();
+    sharePath = converted;
+    return true;
+}
+
+std::vector<std::string> ToSharePaths(const std::vector<std::string> &asked) {
+    std::vector<std::string> sharePaths;
+    for (const std::string &path : asked) {
+        sharePaths.push_back(path);
+        (void)ToSharePath(sharePaths.back(), path); // what is no path at all stays as typed
+    }
+    return sharePaths;
+}
+
+std::string ToFullPath(const std::string &sharePath) {
+    std::string fullPath;
+    (void)fileindex::GetFullPath(fullPath, sharePath); // empty on failure
+    ClearErrors();
+    return fullPath;
 }
 
 Json::Value ArrayOf(const std::vector<std::string> &paths) {

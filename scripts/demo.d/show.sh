@@ -199,7 +199,7 @@ no_file() { # PATH...
 }
 
 status_is() { # PATH STATUS
-    PATH=$PROGRAMS:$PATH fileindexctl get "$1" --json | grep --quiet --fixed-strings "\"status\":\"$2\""
+    PATH=$PROGRAMS:$PATH fileindexctl show "$1" --json | grep --quiet --fixed-strings "\"status\":\"$2\""
 }
 
 service_is() {

@@ -117,7 +117,7 @@ TEST_P(HelpTest, ShowsUsageAndExamples) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Commands, HelpTest,
-                         ::testing::Values("", "add", "list", "get", "remove", "reindex", "pause",
+                         ::testing::Values("", "add", "list", "show", "remove", "reindex", "pause",
                                            "resume", "query", "share", "share\nrename",
                                            "share\npause", "share\nresume"));
 
@@ -158,8 +158,8 @@ INSTANTIATE_TEST_SUITE_P(
         Mistake{"AddFinalSlash", {"add", "/photos/", "--all"}, "final slashes"},
         Mistake{"AddDots", {"add", "/photos/../x", "--all"}, "is not plain"},
         Mistake{"AddOneNameForTwo", {"add", "/a", "/b", "--all", "--name", "N"}, "single folder"},
-        Mistake{"GetNothing", {"get"}, "PATH is required"},
-        Mistake{"GetTwo", {"get", "/a", "/b"}, "/b"},
+        Mistake{"ShowNothing", {"show"}, "PATH is required"},
+        Mistake{"ShowTwo", {"show", "/a", "/b"}, "/b"},
         Mistake{"RemoveNothing", {"remove"}, "PATH is required"},
         Mistake{"RemoveRelativePath", {"remove", "photos"}, "no share path"},
         Mistake{"ReindexNothing", {"reindex"}, "PATH is required"},
@@ -311,9 +311,9 @@ TEST_F(FileindexctlTest, ListShowsWhatWaits) {
 TEST_F(FileindexctlTest, NamesCannotPlayTricksOnTheTerminal) {
     Save("{\"/photos\":{\"name\":\"a\\n\\u001b[31m\\u202e\\\\\xff\",\"photo\":true}}");
     EXPECT_EQ(Ctl({"list"}).out, "/photos  a\\n\\x1b[31m\\u202e\\\\\\xff  photo  finished\n");
-    EXPECT_THAT(Ctl({"get", "/photos"}).out, HasSubstr("a\\n\\x1b[31m\\u202e\\\\\\xff\n"));
+    EXPECT_THAT(Ctl({"show", "/photos"}).out, HasSubstr("a\\n\\x1b[31m\\u202e\\\\\\xff\n"));
     EXPECT_THAT(Ctl({"list", "--json"}).out, HasSubstr("\xff")); // byte for byte
-    EXPECT_THAT(Ctl({"get", "/a\x1b[31m"}).error, HasSubstr("/a\\x1b[31m is not set"));
+    EXPECT_THAT(Ctl({"show", "/a\x1b[31m"}).error, HasSubstr("/a\\x1b[31m is not set"));
 }
 
 TEST_F(FileindexctlTest, WideAndCombiningCharactersStayAligned) {
@@ -348,11 +348,11 @@ TEST_F(FileindexctlTest, ListOfBrokenSettingsFails) {
     }
 }
 
-// --- get ----------------------------------------------------------------------------------------
+// --- show ---------------------------------------------------------------------------------------
 
-TEST_F(FileindexctlTest, GetShowsOneFolder) {
+TEST_F(FileindexctlTest, ShowShowsOneFolder) {
     Save(kTwo);
-    const Outcome outcome = Ctl({"get", "/media/films"});
+    const Outcome outcome = Ctl({"show", "/media/films"});
     EXPECT_EQ(outcome.status, kDone);
     EXPECT_EQ(outcome.out, "path       /media/films\n"
                            "full path  /volume2/media/films\n"
@@ -362,27 +362,27 @@ TEST_F(FileindexctlTest, GetShowsOneFolder) {
     EXPECT_EQ(outcome.error, "");
 }
 
-TEST_F(FileindexctlTest, GetAsJsonIsOneCompactObject) {
+TEST_F(FileindexctlTest, ShowAsJsonIsOneCompactObject) {
     Save(kTwo);
-    EXPECT_EQ(Ctl({"get", "/photos", "--json"}).out,
+    EXPECT_EQ(Ctl({"show", "/photos", "--json"}).out,
               R"({"additional":{"is_valid":true,"status":"finished"},"audio":false,)"
               R"("document":false,"name":"Photos","path":"/photos","photo":true,"video":false})"
               "\n");
 }
 
-TEST_F(FileindexctlTest, GetOfWhatIsNotSetFindsNothing) {
+TEST_F(FileindexctlTest, ShowOfWhatIsNotSetFindsNothing) {
     Save(kPhotos);
     for (const char *path : {"/photo", "/Photos", "/photos/2016"}) {
-        const Outcome outcome = Ctl({"get", path});
+        const Outcome outcome = Ctl({"show", path});
         EXPECT_EQ(outcome.status, kNotFound);
         EXPECT_EQ(outcome.out, "");
         EXPECT_THAT(outcome.error, HasSubstr(std::string(path) + " is not set."));
     }
 }
 
-TEST_F(FileindexctlTest, GetOfAFolderWhoseShareIsGoneStillShowsIt) {
+TEST_F(FileindexctlTest, ShowOfAFolderWhoseShareIsGoneStillShowsIt) {
     Save(R"({"/gone":{"name":"G","photo":true}})");
-    const Outcome outcome = Ctl({"get", "/gone"});
+    const Outcome outcome = Ctl({"show", "/gone"});
     EXPECT_EQ(outcome.status, kDone);
     EXPECT_THAT(outcome.out, AllOf(HasSubstr("full path  -\n"), HasSubstr("cannot be indexed")));
 }

@@ -17,12 +17,12 @@ namespace {
 namespace fileindex = VANO::FILEINDEX;
 
 constexpr char kFooter[] = R"(Examples:
-  fileindexctl get /photos
-  fileindexctl get /photos --json)";
+  fileindexctl show /photos
+  fileindexctl show /photos --json)";
 
 struct Options {
     std::string path;
-    bool json = false;
+    JsonMode json = JsonMode::kOff;
 };
 
 void PrintLines(const Json::Value &folder, const std::string &fullPath) {
@@ -48,8 +48,8 @@ ExitCode Run(const Options &options) {
     fileindex::Folder folder;
     (void)folder.Reload(options.path, setting); // a share that is gone shows in the status
     const Json::Value answer = folder.asJson(AdditionalKeys());
-    if (options.json) {
-        PrintJson(answer);
+    if (options.json != JsonMode::kOff) {
+        PrintJson(answer, options.json);
     } else {
         PrintLines(answer, folder.full_path);
     }
@@ -58,12 +58,12 @@ ExitCode Run(const Options &options) {
 
 } // namespace
 
-Action DeclareGet(CLI::App &app) {
+Action DeclareShow(CLI::App &app) {
     const auto options = std::make_shared<Options>();
     app.add_option("PATH", options->path, "Share path of the folder")
         ->required()
         ->check(CheckSharePath);
-    app.add_flag("--json", options->json, "Answer with one JSON object");
+    AddJsonOption(app, options->json);
     app.footer(kFooter);
     return [options] { return Run(*options); };
 }
