@@ -1,10 +1,14 @@
+#include <algorithm>
 #include <fileindex/index_mgr.h>
+#include <iostream>
 #include <memory>
 
 #include "command.h"
 #include "messages.h"
 #include "output.h"
 #include "paths.h"
+#include "query_reason.h"
+#include "text.h"
 
 namespace CTL {
 
@@ -13,27 +17,84 @@ namespace {
 using VANO::FILEINDEX::Folder;
 using VANO::FILEINDEX::IndexMgr;
 
-constexpr char kFooter[] = R"(Exit status: 0 when all of them are indexed, 3 otherwise.
+constexpr char kFooter[] =
+    R"(A path is indexed when it is an indexed folder or lies in one. --why names the
+setting that governs it, with its file types, and what keeps the path from being
+indexed.
+
+Exit status: 0 when all of them are indexed, 3 otherwise.
 
 Examples:
   fileindexctl query /photos/2016
   fileindexctl query --full-path /volume1/photos/2016/a.jpg
+  fileindexctl query --why /volume1/photos/@eaDir
   fileindexctl query --share photos music --json)";
 
 struct Options {
-    std::vector<std::string> paths;
+    std::vector<std::string> asked;
     bool isShare = false;
     bool isFullPath = false;
+    bool isWhy = false;
     JsonMode json = JsonMode::kOff;
 };
 
-bool IsIndexed(const std::string &path, const Options &options,
-               const std::vector<Folder> &folders) {
+struct Answer {
+    bool isIndexed;
+    Reason reason;
+};
+
+const char *Word(const Answer &answer) {
+    return answer.isIndexed ? "indexed" : "not indexed";
+}
+
+Answer AnswerTo(const std::string &asked, const Options &options,
+                const std::vector<Folder> &folders) {
     if (options.isShare) {
-        return IndexMgr::IsShareIndexed(path);
+        return {IndexMgr::IsShareIndexed(asked),
+                options.isWhy ? ReasonOfShare(asked, folders) : Reason()};
     }
-    return options.isFullPath ? IndexMgr::IsFullPathIndexed(path, folders)
-                              : IndexMgr::IsPathIndexed(path, folders);
+    Location location;
+    if (options.isFullPath) {
+        location = {SharePathOfFullPath(asked), asked};
+    } else if (ToSharePath(location.sharePath, asked)) {
+        location.fullPath = ToFullPath(location.sharePath);
+    }
+    const bool isIndexed = options.isFullPath
+                               ? IndexMgr::IsFullPathIndexed(location.fullPath, folders)
+                               : IndexMgr::IsPathIndexed(location.sharePath, folders);
+    return {isIndexed, options.isWhy ? ReasonOf(location, isIndexed, folders) : Reason()};
+}
+
+Json::Value AsJson(const std::string &asked, const Answer &answer, bool isWhy) {
+    Json::Value value = isWhy ? answer.reason.facts : Json::Value(Json::objectValue);
+    value["asked"] = asked;
+    value["indexed"] = answer.isIndexed;
+    return value;
+}
+
+void PrintWithReasons(const std::vector<std::string> &asked, const std::vector<Answer> &answers) {
+    for (std::size_t i = 0; i < asked.size(); ++i) {
+        std::cout << Word(answers[i]) << "  " << Shown(asked[i]) << '\n';
+        for (const std::string &line : answers[i].reason.lines) {
+            std::cout << "  " << line << '\n';
+        }
+    }
+}
+
+void Print(const std::vector<std::string> &asked, const std::vector<Answer> &answers) {
+    Table table({"ANSWER", "PATH"});
+    for (std::size_t i = 0; i < asked.size(); ++i) {
+        table.Add({Word(answers[i]), asked[i]});
+    }
+    table.Print();
+}
+
+void PrintAsJson(const std::vector<Answer> &answers, const Options &options) {
+    Json::Value list(Json::objectValue);
+    for (std::size_t i = 0; i < answers.size(); ++i) {
+        list["query"].append(AsJson(options.asked[i], answers[i], options.isWhy));
+    }
+    PrintJson(list, options.json);
 }
 
 ExitCode Run(const Options &options) {
@@ -42,28 +103,27 @@ ExitCode Run(const Options &options) {
     if (!IndexMgr::List(folders)) {
         return Fail("Cannot tell what is indexed");
     }
-    Table table({"ANSWER", "PATH"});
-    Json::Value answers(Json::objectValue);
-    ExitCode result = kDone;
-    for (const std::string &path : options.paths) {
-        const bool isIndexed = IsIndexed(path, options, folders);
-        table.Add({isIndexed ? "indexed" : "not indexed", path});
-        answers[path] = isIndexed;
-        result = isIndexed ? result : kNotFound;
+    std::vector<Answer> answers;
+    for (const std::string &asked : options.asked) {
+        answers.push_back(AnswerTo(asked, options, folders));
     }
     if (options.json != JsonMode::kOff) {
-        PrintJson(answers, options.json);
+        PrintAsJson(answers, options);
+    } else if (options.isWhy) {
+        PrintWithReasons(options.asked, answers);
     } else {
-        table.Print();
+        Print(options.asked, answers);
     }
-    return result;
+    const bool isAll = std::all_of(answers.begin(), answers.end(),
+                                   [](const Answer &answer) { return answer.isIndexed; });
+    return isAll ? kDone : kNotFound;
 }
 
 std::string MistakeIn(const Options &options) {
-    for (const std::string &path : options.paths) {
+    for (const std::string &asked : options.asked) {
         std::string mistake = options.isShare      ? std::string()
-                              : options.isFullPath ? CheckFullPath(path)
-                                                   : CheckSharePath(path);
+                              : options.isFullPath ? CheckFullPath(asked)
+                                                   : CheckSharePath(asked);
         if (!mistake.empty()) {
             return mistake;
         }
@@ -75,10 +135,11 @@ std::string MistakeIn(const Options &options) {
 
 Action DeclareQuery(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    AddPathsTo(app, options->paths, "Share paths, or what the options say");
+    AddPathsTo(app, options->asked, "Share paths or full paths, or what the options say");
     CLI::Option *share = app.add_flag("--share", options->isShare, "They are names of shares");
-    app.add_flag("--full-path", options->isFullPath, "They are paths of the file system")
+    app.add_flag("--full-path", options->isFullPath, "They are full paths, whatever they look like")
         ->excludes(share);
+    app.add_flag("--why", options->isWhy, "Tell the reason too");
     AddJsonOption(app, options->json);
     app.footer(kFooter);
     app.callback([options] {

@@ -1,10 +1,15 @@
 #include <algorithm>
 #include <fileindex/index_mgr.h>
+#include <fileindex/share_path.h>
+#include <iostream>
 #include <memory>
+#include <set>
 
 #include "command.h"
+#include "folder_view.h"
 #include "messages.h"
 #include "paths.h"
+#include "text.h"
 
 namespace CTL {
 
@@ -15,61 +20,84 @@ using VANO::FILEINDEX::IndexMgr;
 
 constexpr char kFooter[] =
     R"(The files stay; a share without indexed folders loses its index. When one of the
-folders is not set, nothing is removed.
+folders is not set, nothing is removed, and the exit status is 3.
 
 Examples:
   fileindexctl remove /photos
-  fileindexctl remove /media/a /media/b)";
+  fileindexctl remove /volume2/media/a /media/b --dry-run)";
 
 struct Options {
     std::vector<std::string> paths;
+    bool isDryRun = false;
 };
 
-bool IsSet(const std::string &path, const std::vector<Folder> &folders) {
-    return std::any_of(folders.begin(), folders.end(),
-                       [&](const Folder &folder) { return folder.path == path; });
-}
-
-std::vector<std::string> NotSet(const std::vector<std::string> &paths,
-                                const std::vector<Folder> &folders) {
-    std::vector<std::string> missing;
+std::set<std::string> SharesOf(const std::vector<std::string> &paths) {
+    std::set<std::string> shares;
     for (const std::string &path : paths) {
-        if (!IsSet(path, folders)) {
-            missing.push_back(path);
+        std::string share;
+        if (VANO::FILEINDEX::GetShareNameByPath(share, path)) {
+            shares.insert(share);
         }
     }
-    return missing;
+    return shares;
 }
 
-ExitCode Run(const Options &options) {
-    const std::string paths = Named(options.paths);
-    std::vector<Folder> folders;
-    if (!IndexMgr::List(folders)) {
-        return Fail("Cannot remove " + paths);
+ExitCode Preview(const std::vector<std::string> &paths, const std::vector<Folder> &folders) {
+    std::vector<std::string> left;
+    for (const Folder &folder : folders) {
+        if (std::find(paths.begin(), paths.end(), folder.path) == paths.end()) {
+            left.push_back(folder.path);
+        }
     }
-    // The library takes a folder that is not set for removed.
-    const auto missing = NotSet(options.paths, folders);
-    if (!missing.empty()) {
-        Say("Nothing is removed: " + Named(missing) + " is not set.");
-        Advise("fileindexctl list shows the folders that are.");
-        return kNotFound;
+    for (const std::string &path : paths) {
+        std::cout << "Would remove " << Shown(path) << ".\n";
     }
-    if (!IndexMgr::Delete(ArrayOf(options.paths))) {
-        if (!IndexMgr::List(folders) ||
-            NotSet(options.paths, folders).size() < options.paths.size()) {
-            return Fail("Cannot remove " + paths);
+    const std::set<std::string> sharesLeft = SharesOf(left);
+    for (const std::string &share : SharesOf(paths)) {
+        if (sharesLeft.count(share) == 0) {
+            std::cout << "Would delete the index of share " << Shown(share) << ".\n";
+        }
+    }
+    if (left.empty()) {
+        std::cout << "Would stop fileindexd and switch Spotlight off: no folder would be left.\n";
+    }
+    return kDone;
+}
+
+ExitCode Remove(const std::vector<std::string> &paths) {
+    if (!While("Telling the indexing service", [&] { return IndexMgr::Delete(ArrayOf(paths)); })) {
+        std::vector<Folder> folders;
+        if (!IndexMgr::List(folders) || NotSet(paths, folders).size() < paths.size()) {
+            return Fail("Cannot remove " + Named(paths));
         }
         return FailHalfWay("The setting is removed", "See the system log.");
     }
-    Say("Removed " + paths + ".");
+    Say("Removed " + Named(paths) + ".");
     return kDone;
+}
+
+ExitCode Run(const Options &options) {
+    const std::vector<std::string> paths = ToSharePaths(options.paths);
+    std::vector<Folder> folders;
+    if (!IndexMgr::List(folders)) {
+        return Fail("Cannot remove " + Named(paths));
+    }
+    // The library takes a folder that is not set for removed.
+    const std::vector<std::string> missing = NotSet(paths, folders);
+    if (!missing.empty()) {
+        Say("Nothing is removed: " + NamedNotSet(missing) + ".");
+        Advise("fileindexctl list shows the folders that are.");
+        return kNotFound;
+    }
+    return options.isDryRun ? Preview(paths, folders) : Remove(paths);
 }
 
 } // namespace
 
 Action DeclareRemove(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    AddPathsTo(app, options->paths, "Share paths of the folders")->check(CheckSharePath);
+    AddPathsTo(app, options->paths, "Folders, by share path or full path")->check(CheckSharePath);
+    AddDryRunOption(app, options->isDryRun);
     app.footer(kFooter);
     return [options] { return Run(*options); };
 }

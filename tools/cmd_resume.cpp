@@ -1,5 +1,6 @@
-#include <fileindex/error_handler.h>
 #include <fileindex/status_mgr.h>
+#include <iostream>
+#include <memory>
 
 #include "command.h"
 #include "messages.h"
@@ -11,11 +12,16 @@ namespace {
 namespace fileindex = VANO::FILEINDEX;
 
 constexpr char kFooter[] = R"(Examples:
-  fileindexctl resume)";
+  fileindexctl resume
+  fileindexctl resume --dry-run)";
 
-ExitCode Run() {
-    if (!fileindex::StatusMgr::Resume()) {
-        if (fileindex::ErrorHandler::GetError() != fileindex::FILEINDEX_ERR_NONE) {
+ExitCode Run(bool isDryRun) {
+    if (isDryRun) {
+        std::cout << "Would end any pause and tell the daemon.\n";
+        return kDone;
+    }
+    if (!While("Telling the daemon", [] { return fileindex::StatusMgr::Resume(); })) {
+        if (!HasNoError()) {
             return Fail("Cannot end the pause");
         }
         return FailHalfWay("The end of the pause is saved",
@@ -28,8 +34,10 @@ ExitCode Run() {
 } // namespace
 
 Action DeclareResume(CLI::App &app) {
+    const auto isDryRun = std::make_shared<bool>(false);
+    AddDryRunOption(app, *isDryRun);
     app.footer(kFooter);
-    return [] { return Run(); };
+    return [isDryRun] { return Run(*isDryRun); };
 }
 
 } // namespace CTL

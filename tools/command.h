@@ -35,14 +35,17 @@ void AddDryRunOption(CLI::App &app, bool &isDryRun);
 
 // One file each, cmd_<name>.cpp.
 Action DeclareAdd(CLI::App &app);
-Action DeclareShow(CLI::App &app);
 Action DeclareList(CLI::App &app);
+Action DeclareMarks(CLI::App &app);
+Action DeclareMigrate(CLI::App &app);
 Action DeclarePause(CLI::App &app);
 Action DeclareQuery(CLI::App &app);
 Action DeclareReindex(CLI::App &app);
 Action DeclareRemove(CLI::App &app);
 Action DeclareResume(CLI::App &app);
+Action DeclareSet(CLI::App &app);
 Action DeclareShare(CLI::App &app);
+Action DeclareShow(CLI::App &app);
 
 } // namespace CTL
 

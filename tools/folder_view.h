@@ -1,19 +1,44 @@
 #ifndef FILEINDEXCTL_FOLDER_VIEW_H
 #define FILEINDEXCTL_FOLDER_VIEW_H
 
+#include <array>
+#include <fileindex/folder.h>
 #include <json/value.h>
+#include <optional>
 #include <string>
+#include <vector>
+
+#include "index_refusal.h"
 
 namespace CTL {
+
+inline constexpr std::array<const char *, 4> kFileTypes = {"document", "audio", "video", "photo"};
 
 // The facts that a listing asks the library for beside the setting itself.
 [[nodiscard]] Json::Value AdditionalKeys();
 
-// "photo, video" of a folder's JSON object.
+// A folder of a list with these facts.
+[[nodiscard]] Json::Value WithFacts(const Json::Value &folder);
+
+// "photo,video" of a folder's JSON object.
 [[nodiscard]] std::string TypesOf(const Json::Value &folder);
 
 // The folder's status in words, from its "additional" facts.
 [[nodiscard]] std::string StatusOf(const Json::Value &folder);
+
+// {"rule", "why", "mend"}; null when there is none.
+[[nodiscard]] Json::Value AsJson(const std::optional<Refusal> &refusal);
+
+// Those whose share is there.
+[[nodiscard]] std::vector<VANO::FILEINDEX::Folder>
+Resolved(const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+[[nodiscard]] bool IsSet(const std::string &path,
+                         const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+// Those of the paths that are no folder settings.
+[[nodiscard]] std::vector<std::string> NotSet(const std::vector<std::string> &paths,
+                                              const std::vector<VANO::FILEINDEX::Folder> &folders);
 
 } // namespace CTL
 

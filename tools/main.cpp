@@ -1,55 +1,58 @@
 #include <csignal>
 #include <exception>
 #include <iostream>
+#include <json/value.h>
 #include <memory>
 
 #include "command.h"
 #include "help.h"
 #include "messages.h"
+#include "mistake.h"
+#include "text.h"
 
 namespace {
 
 const std::vector<CTL::Command> kCommands = {
-    {"add", "Index folders, or index more of them", CTL::DeclareAdd},
     {"list", "Show the indexed folders", CTL::DeclareList},
     {"show", "Show one indexed folder", CTL::DeclareShow},
+    {"add", "Index folders, or index more of them", CTL::DeclareAdd},
+    {"set", "Change what is indexed of folders, or their name", CTL::DeclareSet},
     {"remove", "Stop indexing folders", CTL::DeclareRemove},
     {"reindex", "Index folders again from the start", CTL::DeclareReindex},
     {"pause", "Pause all indexing", CTL::DeclarePause},
     {"resume", "Go on with indexing", CTL::DeclareResume},
-    {"query", "Tell whether paths are indexed", CTL::DeclareQuery},
+    {"query", "Tell whether paths are indexed, and why", CTL::DeclareQuery},
     {"share", "Follow what happens to a share", CTL::DeclareShare},
+    {"marks", "Tell or mark which steps of an upgrade are done", CTL::DeclareMarks},
+    {"migrate", "Follow an upgrade from the previous release", CTL::DeclareMigrate},
 };
 
-constexpr char kFooter[] = R"(Paths are share paths: /SHARE or /SHARE/FOLDER.
+constexpr char kFooter[] =
+    R"(A path is a share path, /SHARE or /SHARE/FOLDER, or a full path of the file
+system. It is a share path when its first part names a share, else a full path
+when it lies in a share, else a share path whose share is gone.
 
-Exit status: 0 done, 1 failed, 2 mistake in the call, 3 not indexed or no such
-folder.
+Exit status: 0 done, 1 failed, 2 mistake in the call, 3 not indexed or nothing
+of that name.
 
 Examples:
   fileindexctl add /photos --photo --video
   fileindexctl list
   fileindexctl COMMAND --help)";
 
-// The subcommand whose arguments were being read.
-std::string NameOf(const CLI::App &app) {
-    const auto chosen = app.get_subcommands();
-    return chosen.empty() ? app.get_name() : app.get_name() + " " + NameOf(*chosen.front());
-}
-
 int Run(int argc, char **argv) {
     CLI::App app("Manages the folders that the file-indexing service indexes.", "fileindexctl");
     app.footer(kFooter);
     app.formatter(std::make_shared<CTL::HelpFormatter>());
+    app.set_help_flag("-h,--help", "Show this text");
+    app.set_version_flag("--version", "fileindexctl " FILEINDEX_VERSION, "Show the version");
     const CTL::Action action = CTL::DeclareCommands(app, kCommands);
     try {
         app.parse(argc, argv);
     } catch (const CLI::Success &help) {
         return app.exit(help);
     } catch (const CLI::ParseError &mistake) {
-        CTL::Say(mistake.what());
-        CTL::Advise("See " + NameOf(app) + " --help.");
-        return CTL::kUsage;
+        return CTL::SayMistake(app, mistake);
     }
     const CTL::ExitCode result = action();
     if (!std::cout.flush()) {
@@ -65,8 +68,12 @@ int main(int argc, char **argv) {
     (void)std::signal(SIGPIPE, SIG_IGN); // so that a reader who went away is a failed write
     try {
         return Run(argc, argv);
+    } catch (const Json::Exception &failure) {
+        CTL::Say("A settings file holds a value of another kind than it should: " +
+                 CTL::Shown(failure.what()));
+        CTL::Advise("Look at the files in /usr/vano/etc/fileindex.");
     } catch (const std::exception &failure) {
         CTL::Say(failure.what());
-        return CTL::kFailed;
     }
+    return CTL::kFailed;
 }

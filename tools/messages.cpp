@@ -2,8 +2,10 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstdlib>
 #include <fileindex/error_handler.h>
 #include <iostream>
+#include <string_view>
 #include <unistd.h>
 #include <vano_platform.h>
 
@@ -70,6 +72,11 @@ bool MayNeedRoot(fileindex::_tag_fileindex_err_ code) {
             code == fileindex::FILEINDEX_ERR_LOCK);
 }
 
+bool CanErase() {
+    const char *terminal = std::getenv("TERM");
+    return terminal != nullptr && std::string_view(terminal) != "dumb";
+}
+
 } // namespace
 
 void Say(const std::string &message) {
@@ -94,6 +101,22 @@ ExitCode FailHalfWay(const std::string &what, const std::string &advice) {
     return kFailed;
 }
 
+bool HasNoError() {
+    return fileindex::ErrorHandler::GetError() == fileindex::FILEINDEX_ERR_NONE;
+}
+
+Working::Working(const std::string &what) : isShown_(::isatty(STDERR_FILENO) == 1 && CanErase()) {
+    if (isShown_) {
+        std::cerr << what << " ..." << std::flush;
+    }
+}
+
+Working::~Working() {
+    if (isShown_) {
+        std::cerr << "\r\033[K" << std::flush;
+    }
+}
+
 std::string Named(const std::vector<std::string> &paths) {
     std::string names;
     const std::size_t count = std::min(paths.size(), kMostNamed);
@@ -102,6 +125,10 @@ std::string Named(const std::vector<std::string> &paths) {
     }
     return paths.size() > count ? names + " and " + std::to_string(paths.size() - count) + " more"
                                 : names;
+}
+
+std::string NamedNotSet(const std::vector<std::string> &paths) {
+    return Named(paths) + (paths.size() == 1 ? " is not set" : " are not set");
 }
 
 } // namespace CTL

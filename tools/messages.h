@@ -23,8 +23,34 @@ ExitCode Fail(const std::string &what);
 // Where the settings did change and only the service did not follow: says so.
 ExitCode FailHalfWay(const std::string &what, const std::string &advice);
 
+// Whether the library has named no error: then the settings are as asked for, and somebody else
+// did not follow.
+[[nodiscard]] bool HasNoError();
+
+// While this lives, a person at a terminal sees what is being waited for.
+class Working {
+  public:
+    explicit Working(const std::string &what);
+    ~Working();
+    Working(const Working &) = delete;
+    Working &operator=(const Working &) = delete;
+
+  private:
+    bool isShown_;
+};
+
+// What `act` returns, with `what` shown meanwhile ("Telling the indexing service").
+template <typename Act>
+[[nodiscard]] auto While(const std::string &what, Act act) {
+    const Working working(what);
+    return act();
+}
+
 // Paths for a message: "/a, /b and 3 more".
 [[nodiscard]] std::string Named(const std::vector<std::string> &paths);
+
+// "/a is not set", or "/a, /b are not set".
+[[nodiscard]] std::string NamedNotSet(const std::vector<std::string> &paths);
 
 } // namespace CTL
 

@@ -24,7 +24,19 @@ std::string JsonModeNumber(const std::string &word) {
             return std::to_string(static_cast<int>(mode));
         }
     }
-    throw CLI::ValidationError("it is short, pretty or off, not '" + Shown(word) + "'");
+    throw CLI::ValidationError("it is short, pretty or off, not '" + word + "'");
+}
+
+// JSON as people write it: a bracket stands behind its key, not below. No name holds a bare line
+// break, so that those found here are the writer's own.
+std::string BracketsRaised(const std::string &text) {
+    std::string raised;
+    std::size_t position = 0;
+    for (std::size_t end = 0; (end = text.find(": \n", position)) != std::string::npos;) {
+        raised.append(text, position, end + 2 - position);
+        position = text.find_first_not_of(' ', end + 3);
+    }
+    return raised.append(text, position, std::string::npos);
 }
 
 void PrintRow(const std::vector<std::string> &cells, const std::vector<std::size_t> &widths) {
@@ -66,7 +78,7 @@ void PrintJson(const Json::Value &value, JsonMode mode) {
     builder["indentation"] = mode == JsonMode::kPretty ? "  " : "";
     builder["enableYAMLCompatibility"] = mode == JsonMode::kPretty; // "key": value
     builder["emitUTF8"] = true;
-    std::cout << Json::writeString(builder, value) << '\n';
+    std::cout << BracketsRaised(Json::writeString(builder, value)) << '\n';
 }
 
 void Table::Add(const std::vector<std::string> &cells) {

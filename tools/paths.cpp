@@ -6,8 +6,6 @@
 #include <fileindex/share_path.h>
 #include <vano_platform.h>
 
-#include "text.h"
-
 namespace CTL {
 
 namespace {
@@ -38,13 +36,13 @@ CLI::Option *AddPathsTo(CLI::App &app, std::vector<std::string> &paths, const ch
 
 std::string CheckSharePath(const std::string &path) {
     if (path.size() < 2 || path[0] != '/' || path[1] == '/') {
-        return "'" + Shown(path) + "' is no share path: it begins with /SHARE";
+        return "'" + path + "' is no share path: it begins with /SHARE";
     }
     return {};
 }
 
 std::string CheckFullPath(const std::string &path) {
-    return !path.empty() && path[0] == '/' ? "" : "'" + Shown(path) + "' does not begin with /";
+    return !path.empty() && path[0] == '/' ? "" : "'" + path + "' does not begin with /";
 }
 
 std::string CheckFolderPath(const std::string &path) {
@@ -55,8 +53,7 @@ std::string CheckFolderPath(const std::string &path) {
     const std::string inner = path + "/";
     for (const char *part : {"//", "/./", "/../"}) {
         if (inner.find(part) != std::string::npos) {
-            return "'" + Shown(path) +
-                   "' is not plain: leave out doubled and final slashes, . and ..";
+            return "'" + path + "' is not plain: leave out doubled and final slashes, . and ..";
         }
     }
     return {};
@@ -66,19 +63,21 @@ bool ToSharePath(std::string &sharePath, const std::string &asked) {
     if (asked.empty() || asked[0] != '/') {
         return false;
     }
-    std::string fullPath;
-    std::string converted = asked;
-    if (!fileindex::GetFullPath(fullPath, asked)) {
-        const std::string share = "/" + ShareOfFullPath(asked);
-        // What lies behind the share's directory, which this gives.
-        if (share.size() > 1 && fileindex::GetFullPath(fullPath, share) &&
-            fileindex::StringStartWith(asked + "/", fullPath + "/")) {
-            converted = share + asked.substr(fullPath.size());
-        }
+    std::string converted;
+    if (ToFullPath(asked).empty()) {
+        converted = SharePathOfFullPath(asked);
     }
-    ClearErrors();
-    sharePath = converted;
+    sharePath = converted.empty() ? asked : converted;
     return true;
+}
+
+std::string SharePathOfFullPath(const std::string &fullPath) {
+    const std::string share = "/" + ShareOfFullPath(fullPath);
+    const std::string directory = ToFullPath(share);
+    if (directory.empty() || !fileindex::StringStartWith(fullPath + "/", directory + "/")) {
+        return {};
+    }
+    return share + fullPath.substr(directory.size());
 }
 
 std::vector<std::string> ToSharePaths(const std::vector<std::string> &asked) {

@@ -26,6 +26,9 @@ CLI::Option *AddPathsTo(CLI::App &app, std::vector<std::string> &paths, const ch
 // False, with `sharePath` untouched, when it does not begin with "/".
 [[nodiscard]] bool ToSharePath(std::string &sharePath, const std::string &asked);
 
+// The share path of a full path; empty when that lies in no share. The last errors are cleared.
+[[nodiscard]] std::string SharePathOfFullPath(const std::string &fullPath);
+
 // ToSharePath() of each; the paths have been checked to begin with "/".
 [[nodiscard]] std::vector<std::string> ToSharePaths(const std::vector<std::string> &asked);
 

@@ -1,0 +1,61 @@
+#include "tools/ctl.h"
+
+#include <csignal>
+#include <sys/stat.h>
+
+namespace VANO::TESTS {
+
+namespace {
+
+constexpr char kSocket[] = "/run/fileindexd.sock";
+constexpr char kService[] = "/etc/init.d/fileindexd";
+constexpr char kPeerOut[] = "/tmp/peer.out";
+
+} // namespace
+
+Outcome Ctl(Words arguments) {
+    arguments.insert(arguments.begin(), FILEINDEXCTL_PATH);
+    return RunToEnd(arguments);
+}
+
+std::string CtlOnTerminal(const std::string &settings, const std::string &arguments) {
+    const Outcome outcome =
+        RunToEnd({"/usr/bin/script", "--quiet", "--return", "--command",
+                  "env " + settings + " " FILEINDEXCTL_PATH " " + arguments, "/dev/null"});
+    EXPECT_EQ(outcome.status, kDone) << outcome.out;
+    return outcome.out;
+}
+
+void CtlTest::SetUp() {
+    for (const char *path :
+         {kFolders, kStatus, kMonitors, kPeerOut, kSocket, "/volume1/photos", "/volume2/media"}) {
+        RemoveTree(path);
+    }
+    PutFile(kShares, R"({"photos":"/volume1/photos","media":"/volume2/media"})");
+    MakeDirs("/volume1/photos/2016");
+    MakeDirs("/volume2/media/films");
+    PutFile(kService, "#!/bin/sh\n"
+                      "### BEGIN INIT INFO\n"
+                      "# Provides:          fileindexd\n"
+                      "# Required-Start:    $remote_fs\n"
+                      "# Required-Stop:     $remote_fs\n"
+                      "# Default-Start:     2 3 4 5\n"
+                      "# Default-Stop:      0 1 6\n"
+                      "### END INIT INFO\n");
+    ASSERT_EQ(::chmod(kService, 0755), 0);
+}
+
+void CtlTest::StartDaemon() {
+    // Long pauses between looks at a queue that is not there.
+    daemon_ = std::make_unique<Child>(Words{PEER_PATH, "--queue", "/tmp/none"}, kPeerOut,
+                                      "/tmp/peer.err");
+    ASSERT_TRUE(Eventually([] { return Exists(kSocket); }));
+}
+
+Words CtlTest::Told() {
+    daemon_->Signal(SIGTERM);
+    EXPECT_EQ(daemon_->Wait(), 0);
+    return LinesOf(ReadText(kPeerOut));
+}
+
+} // namespace VANO::TESTS

@@ -1,0 +1,46 @@
+#include <gmock/gmock.h>
+
+#include "tools/ctl.h"
+
+namespace VANO::TESTS {
+namespace {
+
+using ::testing::HasSubstr;
+
+TEST_F(CtlTest, MigrateWithoutFoldersStopsTheDaemon) {
+    EXPECT_EQ(Ctl({"migrate", "--dry-run"}).out, "Would stop fileindexd: no folder is indexed.\n");
+    const Outcome outcome = Ctl({"migrate"});
+    EXPECT_EQ(outcome.status, kDone);
+    EXPECT_EQ(outcome.error, "fileindexctl: fileindexd is stopped: no folder is indexed.\n");
+}
+
+TEST_F(CtlTest, MigrateDryRunTellsAndDoesNothing) {
+    Save(kTwo);
+    const Outcome outcome = Ctl({"migrate", "--dry-run"});
+    EXPECT_EQ(outcome.status, kDone);
+    EXPECT_EQ(outcome.out, "Would start fileindexd and switch Spotlight on.\n"
+                           "Would have every share with indexed folders watched.\n"
+                           "Would queue /media/films for a new index.\n"
+                           "Would queue /photos for a new index.\n");
+    EXPECT_FALSE(Exists(kPhotoQueue));
+    EXPECT_FALSE(Exists(kMonitors));
+}
+
+TEST_F(CtlTest, MigrateThatStopsHalfWaySaysSo) {
+    Save(kTwo);
+    RemoveTree("/etc/init.d/fileindexd"); // there is no such service to start
+    const Outcome outcome = Ctl({"migrate"});
+    EXPECT_EQ(outcome.status, kFailed);
+    EXPECT_THAT(outcome.error, HasSubstr("The migration stopped half-way"));
+    EXPECT_FALSE(Exists(kPhotoQueue));
+}
+
+TEST_F(CtlTest, MigrateOfBrokenSettingsFails) {
+    Save("[]");
+    const Outcome outcome = Ctl({"migrate"});
+    EXPECT_EQ(outcome.status, kFailed);
+    EXPECT_THAT(outcome.error, HasSubstr("Cannot migrate: a settings file"));
+}
+
+} // namespace
+} // namespace VANO::TESTS

@@ -1,0 +1,50 @@
+#include <gmock/gmock.h>
+
+#include "tools/ctl.h"
+
+namespace VANO::TESTS {
+namespace {
+
+using ::testing::HasSubstr;
+using ::testing::Not;
+
+TEST_F(CtlTest, TablesOnATerminalHaveHeadings) {
+    Save(kPhotos);
+    const std::string rows = "/photos  Photos  photo  finished\r\n";
+    EXPECT_EQ(CtlOnTerminal("TERM=xterm", "list"),
+              "\033[1mPATH     NAME    TYPES  STATUS\033[0m\r\n" + rows);
+    EXPECT_EQ(CtlOnTerminal("TERM=dumb", "list"), "PATH     NAME    TYPES  STATUS\r\n" + rows);
+    EXPECT_EQ(CtlOnTerminal("TERM=xterm NO_COLOR=1", "list"),
+              "PATH     NAME    TYPES  STATUS\r\n" + rows);
+    EXPECT_EQ(CtlOnTerminal("TERM=xterm NO_COLOR=", "list"), // empty is as if it were not there
+              CtlOnTerminal("TERM=xterm", "list"));
+}
+
+TEST_F(CtlTest, OnATerminalJIsPretty) {
+    Save(kPhotos);
+    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "list -j"), HasSubstr("  \"total\": 1\r\n"));
+    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "list --json"), HasSubstr("\"total\":1}\r\n"));
+}
+
+TEST_F(CtlTest, OnATerminalChangesSayAtOnceWhatIsWaitedFor) {
+    StartDaemon();
+    Save(kPhotos);
+    EXPECT_EQ(CtlOnTerminal("TERM=xterm", "resume"),
+              "Telling the daemon ...\r\033[Kfileindexctl: Indexing goes on.\r\n");
+    EXPECT_EQ(CtlOnTerminal("TERM=dumb", "resume"), "fileindexctl: Indexing goes on.\r\n");
+}
+
+TEST_F(CtlTest, OffATerminalNoEscapeCodeIsWritten) {
+    StartDaemon();
+    Save("{\"/photos\":{\"name\":\"\\u001b[31m\",\"photo\":true}}");
+    for (const Words &arguments :
+         {Words{"list"}, Words{"show", "/photos"}, Words{"share", "list"}, Words{"--help"},
+          Words{"query", "--why", "/photos"}, Words{"set", "/photos", "--name", "\x1b]0;x\a"}}) {
+        const Outcome outcome = Ctl(arguments);
+        EXPECT_EQ(outcome.status, kDone);
+        EXPECT_THAT(outcome.out + outcome.error, Not(HasSubstr("\x1b")));
+    }
+}
+
+} // namespace
+} // namespace VANO::TESTS

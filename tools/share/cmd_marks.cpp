@@ -1,0 +1,140 @@
+// no-space, need-reindex: the marks of shares in the status file.
+
+#include <fileindex/status_mgr.h>
+#include <iostream>
+#include <memory>
+
+#include "messages.h"
+#include "output.h"
+#include "share/commands.h"
+#include "share/shares.h"
+#include "text.h"
+
+namespace CTL {
+
+namespace {
+
+using VANO::FILEINDEX::StatusMgr;
+
+constexpr char kNoSpaceFooter[] =
+    R"(Without an option tells whether the share is marked: exit status 0 when it is, 3
+when not. --set notifies the administrators, unless it was marked already.
+
+Examples:
+  fileindexctl share no-space photos
+  fileindexctl share no-space photos --revive)";
+
+constexpr char kNeedReindexFooter[] =
+    R"(Without an option tells whether the share is marked: exit status 0 when it is, 3
+when not.
+
+Examples:
+  fileindexctl share need-reindex photos --json
+  fileindexctl share need-reindex photos --set)";
+
+// A mark that a share can have, and what is said about it.
+struct Mark {
+    const char *key;
+    const char *yes; // "is out of space"
+    const char *no;
+    bool (*has)(const std::string &share);
+    bool (*change)(const std::string &share, bool isSet);
+};
+
+constexpr Mark kNoSpace = {"no_space", "is marked as out of space", "is not marked as out of space",
+                           StatusMgr::ShareIsNoSpace, StatusMgr::ShareSetNoSpace};
+constexpr Mark kNeedReindex = {"need_reindex", "is marked as needing a new index",
+                               "is not marked as needing a new index",
+                               StatusMgr::ShareIsNeedReindex, StatusMgr::ShareSetNeedReindex};
+
+struct Options {
+    std::string share;
+    bool set = false;
+    bool clear = false;
+    bool revive = false;
+    bool isDryRun = false;
+    JsonMode json = JsonMode::kOff;
+
+    [[nodiscard]] bool IsChange() const { return set || clear || revive; }
+};
+
+ExitCode Tell(const Options &options, const Mark &mark) {
+    const bool hasMark = mark.has(options.share);
+    if (options.json != JsonMode::kOff) {
+        Json::Value answer(Json::objectValue);
+        answer["name"] = options.share;
+        answer[mark.key] = hasMark;
+        PrintJson(answer, options.json);
+    } else {
+        std::cout << "Share " << Shown(options.share) << ' ' << (hasMark ? mark.yes : mark.no)
+                  << ".\n";
+    }
+    return hasMark ? kDone : kNotFound;
+}
+
+ExitCode Change(const Options &options, const Mark &mark) {
+    const std::string sentence =
+        "hare " + Shown(options.share) + " " + (options.set ? mark.yes : mark.no);
+    if (options.isDryRun) {
+        std::cout << "Would see to it that s" << sentence << ".\n";
+        return kDone;
+    }
+    const bool isDone = While("Telling the indexing service", [&] {
+        return options.revive ? StatusMgr::ShareRevive(options.share)
+                              : mark.change(options.share, options.set);
+    });
+    if (isDone) {
+        Say("S" + sentence + (options.revive ? ", and is worked on again." : "."));
+        return kDone;
+    }
+    if (options.revive && !mark.has(options.share) && HasNoError()) {
+        return FailHalfWay("The mark is cleared",
+                           "The daemon could not be told: is fileindexd running?");
+    }
+    return Fail("Cannot change the mark of share " + Shown(options.share));
+}
+
+ExitCode Run(const Options &options, const Mark &mark) {
+    ShareState share;
+    if (!LookUpShare(share, options.share)) {
+        return Fail("Cannot look up share " + Shown(options.share));
+    }
+    // Marks of shares that are gone can be cleared.
+    const bool isKnown = !share.directory.empty() || mark.has(options.share);
+    if (!isKnown) {
+        Say("No share has the name " + Shown(options.share) + ".");
+        Advise("fileindexctl share list shows the shares.");
+        return kNotFound;
+    }
+    return options.IsChange() ? Change(options, mark) : Tell(options, mark);
+}
+
+std::shared_ptr<Options> AddMarkOptionsTo(CLI::App &app) {
+    const auto options = std::make_shared<Options>();
+    AddShareTo(app, "SHARE", options->share, "Name of the share");
+    CLI::Option *set = app.add_flag("--set", options->set, "Set the mark");
+    app.add_flag("--clear", options->clear, "Clear the mark")->excludes(set);
+    AddDryRunOption(app, options->isDryRun);
+    AddJsonOption(app, options->json);
+    return options;
+}
+
+} // namespace
+
+Action DeclareShareNoSpace(CLI::App &app) {
+    const auto options = AddMarkOptionsTo(app);
+    app.add_flag("--revive", options->revive,
+                 "Clear the mark and have the daemon work on the share again")
+        ->excludes(app.get_option("--set"))
+        ->excludes(app.get_option("--clear"));
+    app.footer(kNoSpaceFooter);
+    return [options] { return Run(*options, kNoSpace); };
+}
+
+Action DeclareShareNeedReindex(CLI::App &app) {
+    const auto options = AddMarkOptionsTo(app);
+    app.footer(kNeedReindexFooter);
+    return [options] { return Run(*options, kNeedReindex); };
+}
+
+} // namespace CTL

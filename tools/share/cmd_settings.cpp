@@ -1,0 +1,133 @@
+// remove, rename: what moves the folder settings of a share.
+
+#include <fileindex/index_mgr.h>
+#include <fileindex/share_path.h>
+#include <iostream>
+#include <memory>
+
+#include "messages.h"
+#include "paths.h"
+#include "share/commands.h"
+#include "share/shares.h"
+#include "text.h"
+
+namespace CTL {
+
+namespace {
+
+using VANO::FILEINDEX::Folder;
+using VANO::FILEINDEX::IndexMgr;
+
+constexpr char kRemoveFooter[] =
+    R"(For a share that is being removed. The daemon is not told and the index stays:
+run fileindexctl share pause and clean first, while the share is there.
+
+Examples:
+  fileindexctl share remove photos --dry-run
+  fileindexctl share remove photos)";
+
+constexpr char kRenameFooter[] =
+    R"(For a share that has been renamed: the system must know it by its new name. Only
+the settings move; fileindexctl share pause goes before it and resume after it.
+
+Examples:
+  fileindexctl share pause photos
+  fileindexctl share rename photos pictures
+  fileindexctl share resume pictures)";
+
+struct RenameOptions {
+    std::string old;
+    std::string now;
+    bool isDryRun = false;
+};
+
+ExitCode SayNoFolders(const std::string &share) {
+    Say("Nothing is done: no folder of share " + Shown(share) + " is indexed.");
+    Advise("fileindexctl share list shows the shares.");
+    return kNotFound;
+}
+
+std::string CountText(const std::vector<Folder> &folders) {
+    return folders.size() == 1 ? "1 folder" : std::to_string(folders.size()) + " folders";
+}
+
+ExitCode RunRemove(const ShareOptions &options) {
+    ShareState share;
+    const std::string what = "the folders of share " + Shown(options.share);
+    if (!LookUpShare(share, options.share)) {
+        return Fail("Cannot remove " + what);
+    }
+    if (share.folders.empty()) {
+        return SayNoFolders(options.share);
+    }
+    if (options.isDryRun) {
+        for (const Folder &folder : share.folders) {
+            std::cout << "Would remove " << Shown(folder.path) << ".\n";
+        }
+        return kDone;
+    }
+    if (!While("Removing", [&] { return IndexMgr::ShareRemove(options.share); })) {
+        return Fail("Cannot remove " + what);
+    }
+    Say("Removed " + CountText(share.folders) + " of share " + Shown(options.share) + ".");
+    if (!share.directory.empty()) {
+        Advise("Its index is still there: fileindexctl share clean deletes it.");
+    }
+    return kDone;
+}
+
+ExitCode PreviewRename(const RenameOptions &options, const std::vector<Folder> &folders) {
+    if (ToFullPath("/" + options.now).empty()) {
+        Say("Cannot move the folders: no share has the name " + Shown(options.now) + ".");
+        Advise("Rename the share first.");
+        return kFailed;
+    }
+    for (const Folder &folder : folders) {
+        std::cout << "Would move " << Shown(folder.path) << " to "
+                  << Shown(VANO::FILEINDEX::ReplaceShareName(folder.path, options.now)) << ".\n";
+    }
+    return kDone;
+}
+
+ExitCode RunRename(const RenameOptions &options) {
+    ShareState share;
+    const std::string what = Shown(options.old) + " to " + Shown(options.now);
+    if (!LookUpShare(share, options.old)) {
+        return Fail("Cannot move the folders of " + what);
+    }
+    if (share.folders.empty()) {
+        return SayNoFolders(options.old);
+    }
+    if (options.isDryRun) {
+        return PreviewRename(options, share.folders);
+    }
+    if (!IndexMgr::ShareRename(options.old, options.now)) {
+        // A new name that is no share's is a bad parameter to the library; this names the reason.
+        std::string fullPath;
+        (void)VANO::FILEINDEX::GetFullPath(fullPath, "/" + options.now);
+        return Fail("Cannot move the folders of " + what);
+    }
+    Say("Moved the folders of " + what + ".");
+    Advise("fileindexctl share resume makes the service follow.");
+    return kDone;
+}
+
+} // namespace
+
+Action DeclareShareRemove(CLI::App &app) {
+    const auto options = std::make_shared<ShareOptions>();
+    AddShareOptionsTo(app, *options);
+    app.footer(kRemoveFooter);
+    return [options] { return RunRemove(*options); };
+}
+
+Action DeclareShareRename(CLI::App &app) {
+    const auto options = std::make_shared<RenameOptions>();
+    AddShareTo(app, "OLD", options->old, "Name that the share had");
+    AddShareTo(app, "NEW", options->now, "Name that it has now");
+    AddDryRunOption(app, options->isDryRun);
+    app.footer(kRenameFooter);
+    return [options] { return RunRename(*options); };
+}
+
+} // namespace CTL
