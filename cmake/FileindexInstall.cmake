@@ -1,5 +1,5 @@
 # What `cmake --install` puts where: libraries, headers, the CMake package, the pkg-config file, the
-# administrator's tool.
+# administrator's tool and its completions.
 
 include(CMakePackageConfigHelpers)
 
@@ -7,6 +7,11 @@ install(TARGETS fileindex vanoplatform
     EXPORT fileindexTargets
     LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}")
 install(TARGETS fileindexctl RUNTIME DESTINATION "${CMAKE_INSTALL_BINDIR}")
+# The names by which the shells look for them.
+install(FILES tools/completions/fileindexctl.bash RENAME fileindexctl
+    DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions")
+install(FILES tools/completions/_fileindexctl
+    DESTINATION "${CMAKE_INSTALL_DATADIR}/zsh/vendor-completions")
 install(DIRECTORY include/fileindex DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}")
 # For whoever writes a provider of the platform boundary.
 install(FILES src/platform/vano_platform.h src/platform/monitor_queue.h

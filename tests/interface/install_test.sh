@@ -51,6 +51,18 @@ echo "== the installed tool finds the installed library"
 "$prefix/bin/fileindexctl" --help >"$work/help.log" || fail "fileindexctl --help"
 grep -q '^Usage:' "$work/help.log" || fail "no usage in $(cat "$work/help.log")"
 
+echo "== the shells find the completion of the installed tool"
+[[ $(head -n 1 "$prefix/share/zsh/vendor-completions/_fileindexctl") == "#compdef fileindexctl" ]] ||
+    fail "no completion for zsh"
+loader=/usr/share/bash-completion/bash_completion
+if [[ -r $loader ]]; then
+    XDG_DATA_DIRS=$prefix/share bash -c '. "$1" && _completion_loader fileindexctl; complete -p fileindexctl' \
+        bash "$loader" >"$work/complete.log" 2>&1 || fail "$(cat "$work/complete.log")"
+    grep -q -- '-F _fileindexctl fileindexctl' "$work/complete.log" || fail "$(cat "$work/complete.log")"
+else
+    echo "skipped for bash: bash-completion is not installed"
+fi
+
 export LD_LIBRARY_PATH=$library
 
 mkdir -p /usr/vano/etc/fileindex /volume1/photos/2016
