@@ -2,6 +2,7 @@
 #include <fileindex/index_mgr.h>
 #include <iostream>
 #include <memory>
+#include <unistd.h>
 
 #include "command.h"
 #include "messages.h"
@@ -76,7 +77,9 @@ void PrintWithReasons(const std::vector<std::string> &asked, const std::vector<A
     for (std::size_t i = 0; i < asked.size(); ++i) {
         std::cout << Word(answers[i]) << "  " << Shown(asked[i]) << '\n';
         for (const std::string &line : answers[i].reason.lines) {
-            std::cout << "  " << line << '\n';
+            const std::string text = "  " + line;
+            std::cout << (IsTerminal() ? Wrapped(text, TerminalColumns(STDOUT_FILENO), 4) : text)
+                      << '\n';
         }
     }
 }

@@ -9,6 +9,7 @@
 #include <unistd.h>
 #include <vano_platform.h>
 
+#include "output.h"
 #include "text.h"
 
 namespace CTL {
@@ -72,6 +73,12 @@ bool MayNeedRoot(fileindex::_tag_fileindex_err_ code) {
             code == fileindex::FILEINDEX_ERR_LOCK);
 }
 
+// A person gets lines that fit, a program one line.
+std::string ForReader(const std::string &message) {
+    return ::isatty(STDERR_FILENO) == 1 ? Wrapped(message, TerminalColumns(STDERR_FILENO), 2)
+                                        : message;
+}
+
 bool CanErase() {
     const char *terminal = std::getenv("TERM");
     return terminal != nullptr && std::string_view(terminal) != "dumb";
@@ -80,11 +87,11 @@ bool CanErase() {
 } // namespace
 
 void Say(const std::string &message) {
-    std::cerr << "fileindexctl: " << message << '\n';
+    std::cerr << ForReader("fileindexctl: " + message) << '\n';
 }
 
 void Advise(const std::string &advice) {
-    std::cerr << "  " << advice << '\n';
+    std::cerr << ForReader("  " + advice) << '\n';
 }
 
 ExitCode Fail(const std::string &what) {

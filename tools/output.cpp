@@ -5,6 +5,7 @@
 #include <iostream>
 #include <json/writer.h>
 #include <string_view>
+#include <sys/ioctl.h>
 #include <unistd.h>
 
 #include "text.h"
@@ -50,6 +51,11 @@ void PrintRow(const std::vector<std::string> &cells, const std::vector<std::size
 
 bool IsTerminal() {
     return ::isatty(STDOUT_FILENO) == 1;
+}
+
+std::size_t TerminalColumns(int fd) {
+    struct winsize size {};
+    return ::ioctl(fd, TIOCGWINSZ, &size) == 0 && size.ws_col > 0 ? size.ws_col : 80;
 }
 
 bool MayUseColour() {

@@ -2,6 +2,7 @@
 #define FILEINDEXCTL_OUTPUT_H
 
 #include <CLI/CLI.hpp>
+#include <cstddef>
 #include <json/value.h>
 #include <string>
 #include <vector>
@@ -11,6 +12,8 @@
 namespace CTL {
 
 [[nodiscard]] bool IsTerminal();
+// How wide the terminal behind a descriptor is; 80 where that cannot be told.
+[[nodiscard]] std::size_t TerminalColumns(int fd);
 [[nodiscard]] bool MayUseColour(); // a terminal that knows colours, and nobody who asked for none
 
 enum class JsonMode { kOff, kShort, kPretty };

@@ -1,5 +1,6 @@
 #include "text.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <utf8proc.h>
 
@@ -94,6 +95,28 @@ std::size_t Columns(const std::string &shown) {
 std::string Padded(const std::string &shown, std::size_t columns) {
     const std::size_t taken = Columns(shown);
     return taken < columns ? shown + std::string(columns - taken, ' ') : shown;
+}
+
+std::string Wrapped(const std::string &shown, std::size_t columns, std::size_t indent) {
+    std::string text;
+    std::size_t taken = 0;
+    for (std::size_t position = 0; position < shown.size();) {
+        // A word with the spaces before it.
+        const std::size_t begin = std::min(shown.find_first_not_of(' ', position), shown.size());
+        const std::size_t end = std::min(shown.find(' ', begin), shown.size());
+        const std::string word = shown.substr(begin, end - begin);
+        if (taken + (begin - position) + Columns(word) > columns && taken > indent) {
+            text += '\n' + std::string(indent, ' ');
+            taken = indent;
+        } else {
+            text.append(begin - position, ' ');
+            taken += begin - position;
+        }
+        text += word;
+        taken += Columns(word);
+        position = end;
+    }
+    return text;
 }
 
 } // namespace CTL

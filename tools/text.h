@@ -17,6 +17,11 @@ namespace CTL {
 // `shown` with spaces after it, so that it takes at least that many columns.
 [[nodiscard]] std::string Padded(const std::string &shown, std::size_t columns);
 
+// Text that Shown() has returned, broken between words so that no line takes more columns, unless a
+// word does. Lines after the first begin with `indent` spaces.
+[[nodiscard]] std::string Wrapped(const std::string &shown, std::size_t columns,
+                                  std::size_t indent);
+
 } // namespace CTL
 
 #endif

@@ -1,4 +1,5 @@
 #include <gmock/gmock.h>
+#include <unistd.h>
 
 #include "tools/ctl.h"
 
@@ -44,6 +45,20 @@ TEST_F(CtlTest, OffATerminalNoEscapeCodeIsWritten) {
         EXPECT_EQ(outcome.status, kDone);
         EXPECT_THAT(outcome.out + outcome.error, Not(HasSubstr("\x1b")));
     }
+}
+
+TEST_F(CtlTest, OnATerminalMessagesBreakBetweenWords) {
+    Save(kPhotos);
+    ASSERT_EQ(::symlink("2016", "/volume1/photos/link"), 0);
+    EXPECT_EQ(CtlOnTerminal("TERM=xterm", "query --why /photos/link"),
+              "indexed  /photos/link\r\n"
+              "  by /photos, for photo\r\n"
+              "  but left out: its path has symbolic links or other detours; it leads to\r\n"
+              "    /volume1/photos/2016\r\n");
+    RemoveTree("/volume1/photos");
+    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "show /photos"),
+                HasSubstr("fileindexctl: /photos cannot be indexed: there is no such directory:\r\n"
+                          "  /volume1/photos.\r\n"));
 }
 
 } // namespace
