@@ -73,7 +73,7 @@ int main(int argc, char **argv) {
                  CTL::Shown(failure.what()));
         CTL::Advise("Look at the files in /usr/vano/etc/fileindex.");
     } catch (const std::exception &failure) {
-        CTL::Say(failure.what());
+        CTL::Say(CTL::Shown(failure.what()));
     }
     return CTL::kFailed;
 }
