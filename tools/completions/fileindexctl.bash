@@ -68,7 +68,7 @@ _fileindexctl() {
     COMPREPLY=()
     # "--option=value" is three words to readline.
     if [[ $cur == = ]]; then
-        cur= attached=yes
+        cur='' attached=yes
     elif [[ $option == = && $COMP_CWORD -gt 2 ]]; then
         option=${COMP_WORDS[COMP_CWORD - 2]} attached=yes
     fi
