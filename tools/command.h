@@ -35,6 +35,7 @@ void AddDryRunOption(CLI::App &app, bool &isDryRun);
 
 // One file each, cmd_<name>.cpp.
 Action DeclareAdd(CLI::App &app);
+Action DeclareDoctor(CLI::App &app);
 Action DeclareList(CLI::App &app);
 Action DeclareMarks(CLI::App &app);
 Action DeclareMigrate(CLI::App &app);

@@ -25,6 +25,7 @@ const std::vector<CTL::Command> kCommands = {
     {"share", "Follow what happens to a share", CTL::DeclareShare},
     {"marks", "Tell or mark which steps of an upgrade are done", CTL::DeclareMarks},
     {"migrate", "Follow an upgrade from the previous release", CTL::DeclareMigrate},
+    {"doctor", "Find what is wrong and how to mend it", CTL::DeclareDoctor},
 };
 
 constexpr char kFooter[] =

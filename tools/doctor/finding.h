@@ -1,0 +1,63 @@
+#ifndef FILEINDEXCTL_DOCTOR_FINDING_H
+#define FILEINDEXCTL_DOCTOR_FINDING_H
+
+#include <json/value.h>
+#include <string>
+#include <vector>
+
+namespace CTL::DOCTOR {
+
+// Worst last.
+enum class Severity {
+    kOk,
+    kUnknown, // could not be looked at, mostly for want of root's rights
+    kWarning, // works now, and may not for long
+    kError,   // something does not work
+};
+
+// What one look has found. The texts are fit for a terminal; names in them have gone through
+// Shown(). `subject` is the path or the name that it is about, byte for byte.
+struct Finding {
+    Severity severity;
+    std::string code; // what scripts match on; never changes
+    std::string subject;
+    std::string what;
+    std::string why;
+    std::vector<std::string> quote;                       // lines to be shown as they are
+    std::string mend;                                     // what to do about it
+    std::string command;                                  // the command that does it
+    Json::Value details = Json::Value(Json::objectValue); // further facts for scripts
+
+    Finding &&Because(std::string text) &&;
+    Finding &&Mend(std::string text, std::string line = {}) &&;
+    Finding &&With(const char *key, const Json::Value &value) &&;
+};
+
+using Findings = std::vector<Finding>;
+
+[[nodiscard]] Finding Ok(std::string code, std::string subject, std::string what);
+[[nodiscard]] Finding Unknown(std::string code, std::string subject, std::string what);
+[[nodiscard]] Finding Warning(std::string code, std::string subject, std::string what);
+[[nodiscard]] Finding Error(std::string code, std::string subject, std::string what);
+
+// `path` cannot be looked at, for the reason `error`, an errno. Unknown where root could.
+[[nodiscard]] Finding Unreadable(std::string code, const std::string &path, int error);
+
+// A word of a command line, quoted where the shell needs it and readable on any terminal.
+[[nodiscard]] std::string Quoted(const std::string &word);
+
+// "1 folder", "2 folders".
+[[nodiscard]] std::string Count(std::size_t number, const std::string &noun);
+
+// "40 min", "3 h", "2 days": rounded down.
+[[nodiscard]] std::string Duration(long long seconds);
+
+// "512 bytes", "17 MiB".
+[[nodiscard]] std::string Size(unsigned long long bytes);
+
+// The text of an errno.
+[[nodiscard]] std::string Reason(int error);
+
+} // namespace CTL::DOCTOR
+
+#endif

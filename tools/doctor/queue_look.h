@@ -1,0 +1,26 @@
+#ifndef FILEINDEXCTL_DOCTOR_QUEUE_LOOK_H
+#define FILEINDEXCTL_DOCTOR_QUEUE_LOOK_H
+
+#include <cstddef>
+#include <string>
+
+namespace CTL::DOCTOR {
+
+constexpr long long kMostQueueBytes = 16LL * 1024 * 1024;
+
+// What one queue file holds.
+struct QueueLook {
+    int error = 0; // the errno when it could not be read
+    unsigned long long bytes = 0;
+    long long age = 0; // seconds since its oldest event, as far as the file system tells
+    std::size_t events = 0;
+    std::size_t malformed = 0; // lines that are no events
+    bool isWhole = true;       // false when no more than kMostQueueBytes were read
+};
+
+// Takes no lock: a line that is being written can be taken for a malformed one.
+[[nodiscard]] QueueLook LookAtQueue(const std::string &path);
+
+} // namespace CTL::DOCTOR
+
+#endif

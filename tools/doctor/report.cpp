@@ -1,0 +1,197 @@
+#include "doctor/report.h"
+
+#include <algorithm>
+#include <iostream>
+#include <sstream>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include "output.h"
+#include "text.h"
+
+namespace CTL::DOCTOR {
+
+namespace {
+
+constexpr std::size_t kUsualColumns = 80;
+constexpr std::size_t kFewestColumns = 40;
+constexpr std::size_t kIndent = 11; // "  warning  "
+constexpr std::size_t kCommandIndent = kIndent + 2;
+
+struct Mark {
+    const char *word;
+    const char *colour;
+};
+
+Mark MarkOf(Severity severity) {
+    switch (severity) {
+    case Severity::kOk:
+        return {"ok", "\033[32m"};
+    case Severity::kUnknown:
+        return {"unknown", "\033[36m"};
+    case Severity::kWarning:
+        return {"warning", "\033[33m"};
+    case Severity::kError:
+        break;
+    }
+    return {"error", "\033[1;31m"};
+}
+
+std::string Coloured(const std::string &text, const char *colour) {
+    return MayUseColour() ? colour + text + "\033[0m" : text;
+}
+
+// 0 for lines of any length.
+std::size_t ScreenColumns() {
+    if (!IsTerminal()) {
+        return 0;
+    }
+    winsize size{};
+    const bool isKnown = ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 0;
+    return isKnown ? std::max<std::size_t>(size.ws_col, kFewestColumns) : kUsualColumns;
+}
+
+// Words on as few lines as they need, each further line indented. The first is begun already, at
+// the same column.
+void PrintWords(const std::string &text) {
+    const std::size_t screen = ScreenColumns();
+    std::istringstream words(text);
+    std::size_t column = kIndent;
+    bool isFirst = true;
+    for (std::string word; words >> word; isFirst = false) {
+        const std::size_t width = Columns(word);
+        if (!isFirst && screen > 0 && column + 1 + width > screen) {
+            std::cout << '\n' << std::string(kIndent, ' ');
+            column = kIndent;
+        } else if (!isFirst) {
+            std::cout << ' ';
+            ++column;
+        }
+        std::cout << word;
+        column += width;
+    }
+    std::cout << '\n';
+}
+
+void PrintParagraph(const std::string &text) {
+    if (!text.empty()) {
+        std::cout << std::string(kIndent, ' ');
+        PrintWords(text);
+    }
+}
+
+void PrintFinding(const Finding &finding) {
+    const Mark mark = MarkOf(finding.severity);
+    const std::string word = Padded(mark.word, kIndent - 4);
+    std::cout << "  " << Coloured(word, mark.colour) << "  ";
+    PrintWords(finding.what);
+    PrintParagraph(finding.why);
+    for (const std::string &line : finding.quote) {
+        std::cout << std::string(kCommandIndent, ' ') << line << '\n';
+    }
+    PrintParagraph(finding.mend);
+    if (!finding.command.empty()) {
+        std::cout << std::string(kCommandIndent, ' ') << Coloured(finding.command, "\033[1m")
+                  << '\n';
+    }
+}
+
+bool IsShown(const Finding &finding, bool onlyProblems) {
+    return !onlyProblems || finding.severity != Severity::kOk;
+}
+
+bool IsShown(const Chapter &chapter, bool onlyProblems) {
+    return std::any_of(chapter.findings.begin(), chapter.findings.end(),
+                       [&](const Finding &finding) { return IsShown(finding, onlyProblems); });
+}
+
+// "2 errors, 1 warning"; empty when all is well.
+std::string SumOf(const Report &report) {
+    std::string sum;
+    const auto add = [&sum](std::size_t count, const std::string &text) {
+        if (count > 0) {
+            sum += (sum.empty() ? "" : ", ") + text;
+        }
+    };
+    const std::size_t errors = CountOf(report, Severity::kError);
+    const std::size_t warnings = CountOf(report, Severity::kWarning);
+    const std::size_t unknown = CountOf(report, Severity::kUnknown);
+    add(errors, Count(errors, "error"));
+    add(warnings, Count(warnings, "warning"));
+    add(unknown, std::to_string(unknown) + " unknown");
+    return sum;
+}
+
+const char *WorstOf(const Report &report) {
+    for (const Severity severity : {Severity::kError, Severity::kWarning, Severity::kUnknown}) {
+        if (CountOf(report, severity) > 0) {
+            return MarkOf(severity).word;
+        }
+    }
+    return MarkOf(Severity::kOk).word;
+}
+
+Json::Value AsJson(const Finding &finding, const Check &check) {
+    Json::Value object = finding.details;
+    object["check"] = check.name;
+    object["severity"] = MarkOf(finding.severity).word;
+    object["code"] = finding.code;
+    object["subject"] = finding.subject;
+    object["what"] = finding.what;
+    object["why"] = finding.why;
+    object["mend"] = finding.mend;
+    object["command"] = finding.command;
+    return object;
+}
+
+} // namespace
+
+std::size_t CountOf(const Report &report, Severity severity) {
+    std::size_t count = 0;
+    for (const Chapter &chapter : report) {
+        count += static_cast<std::size_t>(
+            std::count_if(chapter.findings.begin(), chapter.findings.end(),
+                          [&](const Finding &finding) { return finding.severity == severity; }));
+    }
+    return count;
+}
+
+void PrintReport(const Report &report, bool onlyProblems) {
+    bool isAnyShown = false;
+    for (const Chapter &chapter : report) {
+        if (!IsShown(chapter, onlyProblems)) {
+            continue;
+        }
+        isAnyShown = true;
+        std::cout << Coloured(chapter.check->title, "\033[1m") << '\n';
+        for (const Finding &finding : chapter.findings) {
+            if (IsShown(finding, onlyProblems)) {
+                PrintFinding(finding);
+            }
+        }
+    }
+    const std::string sum = SumOf(report);
+    if (isAnyShown) {
+        std::cout << '\n' << (sum.empty() ? "Nothing is wrong." : sum + ".") << '\n';
+    }
+}
+
+Json::Value ReportAsJson(const Report &report, bool onlyProblems) {
+    Json::Value findings(Json::arrayValue);
+    for (const Chapter &chapter : report) {
+        for (const Finding &finding : chapter.findings) {
+            if (IsShown(finding, onlyProblems)) {
+                findings.append(AsJson(finding, *chapter.check));
+            }
+        }
+    }
+    Json::Value object(Json::objectValue);
+    object["result"] = WorstOf(report);
+    object["errors"] = Json::UInt64(CountOf(report, Severity::kError));
+    object["warnings"] = Json::UInt64(CountOf(report, Severity::kWarning));
+    object["unknown"] = Json::UInt64(CountOf(report, Severity::kUnknown));
+    object["findings"] = findings;
+    return object;
+}
+
+} // namespace CTL::DOCTOR
