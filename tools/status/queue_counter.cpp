@@ -1,0 +1,134 @@
+#include "status/queue_counter.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <fcntl.h>
+#include <string_view>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace CTL {
+
+namespace {
+
+constexpr char kTakenSuffix[] = ".tmp";
+constexpr std::size_t kChunkBytes = std::size_t{64} * 1024;
+constexpr std::size_t kRememberedBytes = 256;
+// A longer line is no event: the library, too, cuts it there.
+constexpr std::size_t kMaxLineBytes = VANO::FILEINDEX::kMaxJsonFileBytes;
+
+} // namespace
+
+QueueFile::QueueFile(const std::string &path)
+    : fd_(::open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC)) {
+    struct stat info {};
+    if (!fd_ || ::fstat(fd_.Get(), &info) != 0) {
+        error_ = errno == ENOENT ? 0 : errno;
+        fd_ = VANO::FILEINDEX::UniqueFd();
+    } else if (!S_ISREG(info.st_mode)) {
+        error_ = EINVAL;
+        fd_ = VANO::FILEINDEX::UniqueFd();
+    } else {
+        identity_ = {info.st_dev, info.st_ino};
+        size_ = info.st_size;
+    }
+}
+
+std::string QueueFile::ReadAt(off_t offset, std::size_t bytes) const {
+    std::string text(bytes, '\0');
+    ssize_t got = 0;
+    do {
+        got = ::pread(fd_.Get(), text.data(), bytes, offset);
+    } while (got < 0 && errno == EINTR);
+    text.resize(got > 0 ? static_cast<std::size_t>(got) : 0);
+    return text;
+}
+
+bool FileCount::IsOf(const QueueFile &file) const {
+    return file.IsOpen() && offset_ > 0 && identity_ == file.WhichFile();
+}
+
+// A file that was emptied and filled again, or a new one that got the number of the old one, may be
+// as long as the old one: the last bytes tell them apart.
+bool FileCount::Continues(const QueueFile &file) const {
+    const auto bytes = static_cast<off_t>(counted_.size());
+    return IsOf(file) && file.Size() >= offset_ &&
+           file.ReadAt(offset_ - bytes, counted_.size()) == counted_;
+}
+
+bool FileCount::Follow(const QueueFile &file, EventCounter &counter, Clock::time_point until) {
+    if (!Continues(file)) {
+        *this = FileCount();
+        identity_ = file.WhichFile();
+    }
+    bool isAtEnd = !file.IsOpen() || file.Size() == offset_;
+    for (bool isTimeLeft = true; !isAtEnd && isTimeLeft; isTimeLeft = Clock::now() < until) {
+        const std::string chunk = file.ReadAt(offset_, kChunkBytes);
+        isAtEnd = chunk.empty();
+        Take(chunk, counter);
+    }
+    if (isAtEnd && !isUnfinishedKnown_) {
+        unfinishedTally_ = EventTally();
+        counter.Count(unfinishedTally_, unfinished_);
+        isUnfinishedKnown_ = true;
+    }
+    return isAtEnd;
+}
+
+void FileCount::AddTo(EventTally &sum) const {
+    sum.Add(tally_);
+    sum.Add(unfinishedTally_);
+}
+
+void FileCount::Take(std::string_view chunk, EventCounter &counter) {
+    isUnfinishedKnown_ = false;
+    offset_ += static_cast<off_t>(chunk.size());
+    counted_ += chunk;
+    counted_.erase(0, counted_.size() - std::min(counted_.size(), kRememberedBytes));
+    for (std::size_t end = chunk.find('\n'); end != std::string_view::npos;
+         end = chunk.find('\n')) {
+        Append(chunk.substr(0, end));
+        counter.Count(tally_, unfinished_);
+        unfinished_.clear();
+        isCut_ = false;
+        chunk.remove_prefix(end + 1);
+    }
+    Append(chunk);
+}
+
+void FileCount::Append(std::string_view part) {
+    isCut_ = isCut_ || unfinished_.size() + part.size() > kMaxLineBytes;
+    if (isCut_) {
+        unfinished_.clear(); // an empty line is no event
+    } else {
+        unfinished_ += part;
+    }
+}
+
+QueueCounter::QueueCounter(std::string path, const std::vector<std::string> &folders)
+    : path_(std::move(path)), counter_(folders) {}
+
+bool QueueCounter::Look(Clock::time_point until) {
+    // In this order a file that is being taken over is met twice, and not missed.
+    QueueFile queue(path_);
+    const QueueFile taken(path_ + kTakenSuffix);
+    if (queue.IsOpen() && taken.IsOpen() && queue.WhichFile() == taken.WhichFile()) {
+        queue = QueueFile();
+    }
+    if (queue_.IsOf(taken)) {
+        taken_ = std::move(queue_);
+        queue_ = FileCount();
+    }
+    const bool isTakenDone = taken_.Follow(taken, counter_, until);
+    const bool isQueueDone = queue_.Follow(queue, counter_, until);
+    sum_ = EventTally();
+    queue_.AddTo(sum_);
+    taken_.AddTo(sum_);
+    error_ = queue.Error() != 0 ? queue.Error() : taken.Error();
+    const auto all = static_cast<double>(queue.Size() + taken.Size());
+    const auto done = static_cast<double>(queue_.Bytes() + taken_.Bytes());
+    counted_ = all > done ? done / all : 1;
+    return isTakenDone && isQueueDone;
+}
+
+} // namespace CTL

@@ -1,0 +1,24 @@
+#ifndef FILEINDEXCTL_TIME_TEXT_H
+#define FILEINDEXCTL_TIME_TEXT_H
+
+#include <ctime>
+#include <string>
+
+namespace CTL {
+
+// "45 s", "20 min", "6 h" or "3 days": one rounded number; what is negative counts as nothing.
+[[nodiscard]] std::string DurationText(long long seconds);
+
+// Whether indexing is paused at `now`. `resumeTime` is what StatusMgr::GetPauseInfo() gives.
+[[nodiscard]] bool IsPaused(long long resumeTime, std::time_t now);
+
+// "paused until Sat 07:30, 6 h left" in local time, with the date where the day is not one of the
+// next six; "paused until resumed" or "not paused".
+[[nodiscard]] std::string PauseText(long long resumeTime, std::time_t now);
+
+// "2026-11-21T13:22:00+0100", for logs and scripts.
+[[nodiscard]] std::string StampText(std::time_t time);
+
+} // namespace CTL
+
+#endif
