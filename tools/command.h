@@ -47,6 +47,8 @@ Action DeclareResume(CLI::App &app);
 Action DeclareSet(CLI::App &app);
 Action DeclareShare(CLI::App &app);
 Action DeclareShow(CLI::App &app);
+Action DeclareStatus(CLI::App &app);
+Action DeclareWatch(CLI::App &app);
 
 } // namespace CTL
 

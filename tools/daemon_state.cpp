@@ -50,4 +50,8 @@ const char *NameOf(DaemonState state) {
     return "unknown";
 }
 
+Colour ColourOf(DaemonState state) {
+    return state == DaemonState::kRunning ? Colour::kGood : Colour::kBad;
+}
+
 } // namespace CTL

@@ -1,6 +1,8 @@
 #ifndef FILEINDEXCTL_DAEMON_STATE_H
 #define FILEINDEXCTL_DAEMON_STATE_H
 
+#include "colour.h"
+
 namespace CTL {
 
 enum class DaemonState { kRunning, kStopped, kUnknown };
@@ -10,6 +12,8 @@ enum class DaemonState { kRunning, kStopped, kUnknown };
 
 // "running", "stopped", "unknown"
 [[nodiscard]] const char *NameOf(DaemonState state);
+
+[[nodiscard]] Colour ColourOf(DaemonState state);
 
 } // namespace CTL
 

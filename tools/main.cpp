@@ -19,6 +19,8 @@ const std::vector<CTL::Command> kCommands = {
     {"set", "Change what is indexed of folders, or their name", CTL::DeclareSet},
     {"remove", "Stop indexing folders", CTL::DeclareRemove},
     {"reindex", "Index folders again from the start", CTL::DeclareReindex},
+    {"status", "Show how the service and the indexing are", CTL::DeclareStatus},
+    {"watch", "Follow the indexing until it is ended", CTL::DeclareWatch},
     {"pause", "Pause all indexing", CTL::DeclarePause},
     {"resume", "Go on with indexing", CTL::DeclareResume},
     {"query", "Tell whether paths are indexed, and why", CTL::DeclareQuery},

@@ -28,10 +28,10 @@ TEST_P(HelpTest, ShowsUsageAndExamples) {
 INSTANTIATE_TEST_SUITE_P(Commands, HelpTest,
                          ::testing::Values("", "add", "list", "show", "set", "remove", "reindex",
                                            "pause", "resume", "query", "share", "share\nlist",
-                                           "share\nrename", "share\nremove", "share\nclean",
-                                           "share\npause", "share\nresume", "share\nno-space",
-                                           "share\nneed-reindex", "marks", "marks\nlist",
-                                           "marks\nset", "migrate"));
+                                           "status", "watch", "share\nrename", "share\nremove",
+                                           "share\nclean", "share\npause", "share\nresume",
+                                           "share\nno-space", "share\nneed-reindex", "marks",
+                                           "marks\nlist", "marks\nset", "migrate"));
 
 class MistakeTest : public CtlTest, public ::testing::WithParamInterface<Mistake> {};
 

@@ -252,6 +252,21 @@ TEST_F(QueueCounterTest, FollowsNoSymbolicLink) {
     EXPECT_EQ(counter.Error(), ELOOP);
 }
 
+TEST_F(QueueCounterTest, FollowsNoSymbolicLinkToTheDirectory) {
+    PutFile("/tmp/elsewhere/queue", Event("/v/a"));
+    RemoveTree("/tmp/queues");
+    ASSERT_EQ(::symlink("/tmp/elsewhere", "/tmp/queues"), 0);
+    EXPECT_EQ(Count(), 0U);
+    EXPECT_EQ(counter.Error(), ENOTDIR);
+    RemoveTree("/tmp/elsewhere");
+}
+
+TEST_F(QueueCounterTest, NoDirectoryIsAnEmptyQueue) {
+    RemoveTree("/tmp/queues");
+    EXPECT_EQ(Count(), 0U);
+    EXPECT_EQ(counter.Error(), 0);
+}
+
 TEST_F(QueueCounterTest, DoesNotWaitAtAPipe) {
     ASSERT_EQ(::mkfifo(kTaken.c_str(), 0600), 0);
     PutFile(kQueue, Event("/v/a"));

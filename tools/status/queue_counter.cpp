@@ -17,10 +17,19 @@ constexpr std::size_t kRememberedBytes = 256;
 // A longer line is no event: the library, too, cuts it there.
 constexpr std::size_t kMaxLineBytes = VANO::FILEINDEX::kMaxJsonFileBytes;
 
+// Users can write where queues are: neither the directory nor the file may be a symbolic link.
+VANO::FILEINDEX::UniqueFd OpenInDirectory(const std::string &path) {
+    constexpr int kDirectory = O_PATH | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
+    constexpr int kFile = O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
+    const std::size_t slash = path.rfind('/');
+    const VANO::FILEINDEX::UniqueFd directory(::open(path.substr(0, slash).c_str(), kDirectory));
+    return VANO::FILEINDEX::UniqueFd(
+        directory ? ::openat(directory.Get(), path.c_str() + slash + 1, kFile) : -1);
+}
+
 } // namespace
 
-QueueFile::QueueFile(const std::string &path)
-    : fd_(::open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC)) {
+QueueFile::QueueFile(const std::string &path) : fd_(OpenInDirectory(path)) {
     struct stat info {};
     if (!fd_ || ::fstat(fd_.Get(), &info) != 0) {
         error_ = errno == ENOENT ? 0 : errno;

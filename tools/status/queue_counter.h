@@ -20,8 +20,8 @@ namespace CTL {
 
 using Clock = std::chrono::steady_clock;
 
-// A queue file, opened to be looked at. A symbolic link is not followed, and anything but a regular
-// file refused.
+// A queue file, opened to be looked at, by its absolute path. A symbolic link in its place or its
+// directory's is not followed, and anything but a regular file refused.
 class QueueFile {
   public:
     QueueFile() = default; // nothing is there

@@ -1,0 +1,98 @@
+#include "status/observed_share.h"
+
+#include <algorithm>
+#include <array>
+#include <climits>
+#include <fileindex/fileindex.h>
+#include <fileindex/index_rules.h>
+#include <fileindex/status_mgr.h>
+
+namespace CTL {
+
+namespace {
+
+namespace fileindex = VANO::FILEINDEX;
+
+std::string QueueOf(const std::string &share) {
+    std::array<char, PATH_MAX> queue{};
+    const int length =
+        FILEIDXQueuePathGet(share.c_str(), queue.data(), static_cast<int>(queue.size()));
+    // A path that fills the buffer was cut: it names something else.
+    return length < 0 || length >= static_cast<int>(queue.size()) - 1 ? "" : queue.data();
+}
+
+} // namespace
+
+void ObservedShare::Add(const fileindex::Folder &folder) {
+    folders_.push_back(folder);
+    isValid_.push_back(fileindex::CanPathBeIndexed(folder.path));
+    fullPaths_.push_back(folder.full_path);
+}
+
+void ObservedShare::Prepare(std::vector<ObservedShare> &former) {
+    isOutOfSpace_ = fileindex::StatusMgr::ShareIsNoSpace(name_);
+    needsReindex_ = fileindex::StatusMgr::ShareIsNeedReindex(name_);
+    // Where no folder has a full path the share is gone, and asking would only be logged.
+    const bool isThere = std::any_of(fullPaths_.begin(), fullPaths_.end(),
+                                     [](const std::string &path) { return !path.empty(); });
+    queue_ = isThere ? QueueOf(name_) : "";
+    if (queue_.empty()) {
+        return;
+    }
+    for (ObservedShare &other : former) {
+        if (other.counter_ && other.queue_ == queue_ && other.fullPaths_ == fullPaths_) {
+            counter_ = std::move(other.counter_);
+            return;
+        }
+    }
+    counter_ = std::make_unique<QueueCounter>(queue_, fullPaths_);
+}
+
+bool ObservedShare::Look(Clock::time_point until) {
+    isCounted_ = !counter_ || counter_->Look(until);
+    return isCounted_;
+}
+
+double ObservedShare::Counted() const {
+    return isCounted_ ? 1 : counter_ ? counter_->Counted() : 0;
+}
+
+FolderState ObservedShare::StateOf(std::size_t folder, const ShareState &share,
+                                   bool isPaused) const {
+    FolderState state;
+    state.setting = folders_[folder].asJson();
+    state.path = folders_[folder].path;
+    state.isValid = isValid_[folder];
+    if (share.pending) {
+        state.pending = counter_->EventsOf(folder);
+    }
+    // The answers of StatusMgr::GetFolderStatus(), which would read the queue once a folder.
+    if (!state.isValid) {
+        state.status = "paused";
+    } else if (isOutOfSpace_) {
+        state.status = "err_no_space";
+    } else if (state.pending.value_or(0) == 0) {
+        state.status = "finished";
+    } else {
+        state.status = isPaused ? "paused" : "processing";
+    }
+    return state;
+}
+
+void ObservedShare::AddTo(ServiceState &state) const {
+    ShareState share;
+    share.name = name_;
+    share.isOutOfSpace = isOutOfSpace_;
+    share.needsReindex = needsReindex_;
+    share.queueError = counter_ ? counter_->Error() : 0;
+    if (counter_ && isCounted_ && share.queueError == 0) {
+        share.pending = counter_->Events();
+    }
+    for (std::size_t folder = 0; folder < folders_.size(); ++folder) {
+        state.folders.push_back(StateOf(folder, share, state.IsPaused()));
+    }
+    state.counted = std::min(state.counted, Counted());
+    state.shares.push_back(std::move(share));
+}
+
+} // namespace CTL

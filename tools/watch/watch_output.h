@@ -1,0 +1,45 @@
+#ifndef FILEINDEXCTL_WATCH_WATCH_OUTPUT_H
+#define FILEINDEXCTL_WATCH_WATCH_OUTPUT_H
+
+#include <vector>
+
+#include "status/progress.h"
+#include "status/service.h"
+
+namespace CTL {
+
+struct WatchedState {
+    ServiceState service;
+    std::vector<Progress> progress; // of the shares, in their order
+};
+
+// Where `watch` shows what it sees.
+class WatchOutput {
+  public:
+    WatchOutput() = default;
+    WatchOutput(const WatchOutput &) = delete;
+    WatchOutput &operator=(const WatchOutput &) = delete;
+    virtual ~WatchOutput() = default;
+
+    // The signals that it wants to be told of.
+    [[nodiscard]] virtual std::vector<int> Signals() const { return {}; }
+
+    // Called first. This one and the next three give false when nothing can be written.
+    [[nodiscard]] virtual bool Begin() { return true; }
+
+    [[nodiscard]] virtual bool Show(const WatchedState &state) = 0;
+
+    // The events are still being counted: some numbers are missing.
+    [[nodiscard]] virtual bool ShowCounting(const WatchedState & /*state*/) { return true; }
+
+    // One of those signals has come.
+    [[nodiscard]] virtual bool Handle(int /*signal*/) { return true; }
+
+    // A descriptor to be waited for, or -1; and whether what is there now asks for the end.
+    [[nodiscard]] virtual int Input() const { return -1; }
+    [[nodiscard]] virtual bool ReadsTheEnd() { return false; }
+};
+
+} // namespace CTL
+
+#endif
