@@ -58,10 +58,17 @@ bool HasLibraryExtension(std::string_view text) {
 
 } // namespace
 
-JsonParser::JsonParser() : reader_(ReaderSettings().newCharReader()) {}
+JsonParser::JsonParser() = default;
 JsonParser::~JsonParser() = default;
 
 bool JsonParser::Parse(Json::Value &value, std::string_view text) {
+    return ParseWithLibrary(value, text);
+}
+
+bool JsonParser::ParseWithLibrary(Json::Value &value, std::string_view text) {
+    if (reader_ == nullptr) {
+        reader_.reset(ReaderSettings().newCharReader()); // as dear as reading an event
+    }
     Json::Value parsed;
     try {
         if (!reader_->parse(text.data(), text.data() + text.size(), &parsed, nullptr)) {

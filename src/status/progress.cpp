@@ -42,19 +42,17 @@ bool IsPathInQueue(const std::string &path, const std::string &queueFile) {
         return false;
     }
     bool found = false;
-    std::string line;
+    std::string_view line;
     QueueEvent event{};
-    // The former path of the last move stands for every later event too, whatever its code.
-    std::string formerPath;
     while (reader.NextLine(line)) {
         if (!reader.ParseEvent(event, line)) {
-            LogError(kUnit, 47, "Malformed command: %s", line.c_str());
+            LogError(kUnit, 47, "Malformed command: %s", std::string(line).c_str());
             continue;
         }
-        if (event.code == kEventMoved) {
-            formerPath.swap(event.formerPath);
-        }
-        found = found || IsSameOrBelow(event.path, folder) || IsSameOrBelow(formerPath, folder);
+        // The former path of a move stands for every later event too, whatever its code: what it
+        // reaches, the move itself has reached.
+        found = found || IsSameOrBelow(event.path, folder) ||
+                (event.code == kEventMoved && IsSameOrBelow(event.formerPath, folder));
     }
     return found;
 }

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <fcntl.h>
-#include <string_view>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -16,7 +15,22 @@ namespace {
 // Far beyond any event. What is longer comes from a file that is no queue, and is cut.
 constexpr std::size_t kMaxLineBytes = kMaxJsonFileBytes;
 // Ends a line that was cut: no JSON object ends so.
-constexpr char kCutMark[] = "...";
+constexpr std::string_view kCutMark = "...";
+
+constexpr std::size_t kFirstBufferBytes = std::size_t{64} * 1024;
+constexpr std::size_t kMaxBufferBytes = kMaxLineBytes + 1; // one more tells that a line is longer
+
+std::string_view TextOf(const Json::Value &string) {
+    const char *begin = nullptr;
+    const char *end = nullptr;
+    (void)string.getString(&begin, &end);
+    return {begin, static_cast<std::size_t>(end - begin)};
+}
+
+// With room for the mark.
+std::unique_ptr<char[]> MakeBuffer(std::size_t size) {
+    return std::unique_ptr<char[]>(new char[size + kCutMark.size()]);
+}
 
 } // namespace
 
@@ -28,37 +42,76 @@ QueueReader::QueueReader(const std::string &path) : file_(MetadataEntry(path).Op
     }
 }
 
+// Doubles the buffer, up to what the longest line needs.
+void QueueReader::Grow() {
+    size_ = size_ == 0 ? kFirstBufferBytes : std::min(2 * size_, kMaxBufferBytes);
+    std::unique_ptr<char[]> larger = MakeBuffer(size_);
+    std::copy_n(buffer_.get(), end_, larger.get());
+    buffer_ = std::move(larger);
+}
+
+// Reads more behind the rest, which moves to the front.
 bool QueueReader::Fill() {
+    std::copy(buffer_.get() + begin_, buffer_.get() + end_, buffer_.get());
+    end_ -= begin_;
+    begin_ = 0;
+    if (end_ == size_) {
+        Grow();
+    }
     ssize_t got = 0;
     do {
-        got = ::read(file_.Get(), buffer_.data(), buffer_.size());
+        got = ::read(file_.Get(), buffer_.get() + end_, size_ - end_);
     } while (got < 0 && errno == EINTR);
-    begin_ = 0;
-    end_ = got > 0 ? static_cast<std::size_t>(got) : 0;
+    end_ += got > 0 ? static_cast<std::size_t>(got) : 0;
     return got > 0;
 }
 
-bool QueueReader::NextLine(std::string &line) {
-    line.clear();
-    bool cut = false;
-    bool ended = false;
-    while (!ended && (begin_ != end_ || Fill())) {
-        const std::string_view rest(buffer_.data() + begin_, end_ - begin_);
-        const std::size_t length = std::min(rest.find('\n'), rest.size());
-        const std::size_t room = kMaxLineBytes - line.size();
-        line.append(rest.substr(0, std::min(length, room)));
-        cut = cut || length > room;
-        ended = length < rest.size();
-        begin_ += length + (ended ? 1 : 0);
-    }
-    if (cut) {
-        line.append(kCutMark);
-    }
-    return ended || !line.empty();
+// The line's first part with the mark, which takes the place of its next byte and of what was not
+// read yet.
+std::string_view QueueReader::CutLine() {
+    char *const line = buffer_.get() + begin_;
+    kCutMark.copy(line + kMaxLineBytes, kCutMark.size());
+    begin_ = end_;
+    cut_ = true;
+    return {line, kMaxLineBytes + kCutMark.size()};
 }
 
-bool QueueReader::ParseEvent(QueueEvent &event, const std::string &line) {
-    if (!parser_.Parse(parsed_, line) || !parsed_.isObject()) {
+void QueueReader::SkipRestOfCutLine() {
+    while (cut_ && (begin_ != end_ || Fill())) {
+        const std::size_t newline = Rest().find('\n');
+        cut_ = newline == std::string_view::npos;
+        begin_ = cut_ ? end_ : begin_ + newline + 1;
+    }
+}
+
+bool QueueReader::NextLine(std::string_view &line) {
+    SkipRestOfCutLine();
+    std::size_t newline = Rest().find('\n');
+    while (newline == std::string_view::npos) {
+        const std::size_t searched = Rest().size();
+        if (searched > kMaxLineBytes) {
+            line = CutLine();
+            return true;
+        }
+        if (!Fill()) {
+            line = Rest();
+            begin_ = end_;
+            return !line.empty();
+        }
+        newline = Rest().find('\n', searched);
+    }
+    line = Rest().substr(0, newline);
+    begin_ += newline + 1;
+    return true;
+}
+
+bool QueueReader::ParseEvent(QueueEvent &event, std::string_view line) {
+    return ReadPlainEvent(event, line) || ReadEventWithLibrary(event, line);
+}
+
+// Decides every line that is not plain.
+bool QueueReader::ReadEventWithLibrary(QueueEvent &event, std::string_view line) {
+    if (!parser_.ParseWithLibrary(parsed_, line) || !parsed_.isObject()) {
         return false;
     }
     const Json::Value &object = parsed_;
@@ -69,9 +122,10 @@ bool QueueReader::ParseEvent(QueueEvent &event, const std::string &line) {
         return false;
     }
     event.code = object["event"].asUInt();
-    event.path = path.asString();
-    event.formerPath =
+    event.path = TextOf(path);
+    formerPath_ =
         formerPath.isConvertibleTo(Json::stringValue) ? formerPath.asString() : std::string();
+    event.formerPath = formerPath_;
     return true;
 }
 

@@ -58,17 +58,20 @@ class QueueReaderTest : public LibraryTest {
         QueueReader reader(kQueue);
         EXPECT_TRUE(reader.IsOpen());
         std::vector<std::string> lines;
-        std::string line = "left over";
+        std::string_view line = "left over";
         while (reader.NextLine(line)) {
-            lines.push_back(line);
+            lines.emplace_back(line);
         }
         EXPECT_FALSE(reader.NextLine(line)) << "there is nothing after the end";
         return lines;
     }
 
-    static bool IsEvent(QueueEvent &event, const std::string &line) {
-        return QueueReader("/dev/null").ParseEvent(event, line);
+    bool IsEvent(QueueEvent &event, std::string_view line) {
+        return reader_.ParseEvent(event, line);
     }
+
+  private:
+    QueueReader reader_{"/dev/null"};
 };
 
 // --- lines ----------------------------------------------------------------------------------
@@ -153,7 +156,7 @@ TEST_F(QueueReaderTest, AReadErrorIsTheEnd) {
 TEST_F(QueueReaderTest, WhatIsAppendedMeanwhileIsRead) {
     PutFile(kQueue, "a\n");
     QueueReader reader(kQueue);
-    std::string line;
+    std::string_view line;
     ASSERT_TRUE(reader.NextLine(line));
     PutFile(kQueue, "a\nb\n");
     ASSERT_TRUE(reader.NextLine(line));
@@ -181,7 +184,7 @@ TEST_F(QueueReaderTest, OnlyARegularFileIsOpenedAndNothingBlocks) {
         QueueReader reader(kQueue);
         EXPECT_EQ(errno, EINVAL) << what;
         EXPECT_FALSE(reader.IsOpen()) << what;
-        std::string line;
+        std::string_view line;
         EXPECT_FALSE(reader.NextLine(line)) << what;
     };
     ASSERT_EQ(::mkfifo(kQueue, 0600), 0);
@@ -307,8 +310,9 @@ TEST_F(QueueReaderTest, AFormerPathIsWhatReadsAsText) {
     for (const auto &row : kRows) {
         QueueEvent event{};
         event.formerPath = "of the line before";
-        EXPECT_TRUE(IsEvent(event, std::string(R"({"event":256,"path":"a","path_old":)") +
-                                       row.value + "}"));
+        const std::string line =
+            std::string(R"({"event":256,"path":"a","path_old":)") + row.value + "}";
+        EXPECT_TRUE(IsEvent(event, line));
         EXPECT_EQ(event.formerPath, row.formerPath) << row.value;
     }
     QueueEvent event{};
@@ -322,7 +326,7 @@ TEST_F(QueueReaderTest, AnEventMayBeTenMegabytesLong) {
     PutFile(kQueue,
             R"({"event":7,"path":"a","data":")" + data + "\"}\n" + R"({"event":8,"path":"b"})");
     QueueReader reader(kQueue);
-    std::string line;
+    std::string_view line;
     QueueEvent event{};
     ASSERT_TRUE(reader.NextLine(line));
     EXPECT_TRUE(reader.ParseEvent(event, line));
@@ -339,7 +343,7 @@ TEST_F(QueueReaderTest, ALineBeyondTheLimitIsCutAndIsNoEvent) {
     for (const bool cut : {false, true}) {
         PutFile(kQueue, longest + (cut ? " \nlast" : "\nlast"));
         QueueReader reader(kQueue);
-        std::string line;
+        std::string_view line;
         QueueEvent event{};
         ASSERT_TRUE(reader.NextLine(line));
         EXPECT_TRUE(line == longest + (cut ? "..." : "")) << "has " << line.size() << " bytes";
@@ -361,7 +365,7 @@ TEST_F(QueueReaderTest, MemoryDoesNotGrowWithALineWithoutEnd) {
     const long before = PeakMemory();
     ASSERT_GT(before, 0);
     QueueReader reader(kQueue);
-    std::string line;
+    std::string_view line;
     EXPECT_TRUE(reader.NextLine(line));
     EXPECT_FALSE(reader.NextLine(line));
     EXPECT_LT(PeakMemory() - before, 256 * 1024); // the limit, and what growing to it takes
@@ -384,7 +388,7 @@ TEST_F(QueueReaderTest, MemoryDoesNotGrowWithTheFile) {
     const long before = PeakMemory();
     ASSERT_GT(before, 0);
     QueueReader reader(kQueue);
-    std::string line;
+    std::string_view line;
     QueueEvent parsed{};
     int events = 0;
     while (reader.NextLine(line)) {

@@ -1,0 +1,101 @@
+#ifndef FILEINDEX_BASE_PLAIN_JSON_H
+#define FILEINDEX_BASE_PLAIN_JSON_H
+
+#include <cstdint>
+#include <cstring>
+#include <string_view>
+
+#include "base/digits.h"
+
+namespace VANO::FILEINDEX {
+
+// Walks through a JSON text token by token, as long as it is plain: no escapes, no fractions, no
+// numbers beyond 18 digits, no deep nesting. That is what settings and events are made of, and what
+// every JSON library reads alike.
+//
+// An operation that fails has said nothing about the text: the JSON library must decide it then.
+// What was walked through up to AtEnd() is valid JSON for that library. Strings are parts of the
+// text and live as long.
+class PlainJson {
+  public:
+    explicit PlainJson(std::string_view text)
+        : at_(text.data()), end_(text.data() + text.size()),
+          escaped_(text.find('\\') != std::string_view::npos) {}
+
+    // This one character, which is no white space.
+    [[nodiscard]] bool Take(char mark) {
+        const bool taken = (at_ != end_ && *at_ == mark) || Next() == mark;
+        at_ += taken ? 1 : 0;
+        return taken;
+    }
+
+    // These characters one after another, the first no white space. For a word, what may follow it
+    // is the next Take()'s business.
+    [[nodiscard]] bool TakeExactly(std::string_view characters) {
+        if (Next() != characters.front() || Left() < characters.size() ||
+            std::memcmp(at_, characters.data(), characters.size()) != 0) {
+            return false;
+        }
+        at_ += characters.size();
+        return true;
+    }
+
+    [[nodiscard]] bool TakeString(std::string_view &value) {
+        if (escaped_ || !Take('"')) {
+            return false;
+        }
+        const auto *const quote = static_cast<const char *>(std::memchr(at_, '"', Left()));
+        if (quote == nullptr) {
+            return false;
+        }
+        value = std::string_view(at_, static_cast<std::size_t>(quote - at_));
+        at_ = quote + 1;
+        return true;
+    }
+
+    [[nodiscard]] bool TakeInteger(std::int64_t &value) {
+        const bool negative = Take('-');
+        const Digits few = Left() >= 8 ? DigitsAmongEight(at_) : Digits{0, 0};
+        const Digits digits = few.count != 0 ? few : DigitsOneByOne();
+        at_ += digits.count;
+        value = negative ? -digits.value : digits.value;
+        return digits.count != 0;
+    }
+
+    // Whether nothing but white space is left.
+    [[nodiscard]] bool AtEnd() { return Next() == '\0' && at_ == end_; }
+
+    // The character that the next token begins with; '\0' at the end.
+    [[nodiscard]] char Next() {
+        while (at_ != end_ && IsSpace(*at_)) {
+            ++at_;
+        }
+        return at_ != end_ ? *at_ : '\0';
+    }
+
+  private:
+    static constexpr std::size_t kMaxDigits = 18; // never too large for 64 bits
+
+    [[nodiscard]] Digits DigitsOneByOne() const {
+        Digits digits{0, 0};
+        for (; digits.count < kMaxDigits && at_ + digits.count != end_; ++digits.count) {
+            const char c = at_[digits.count];
+            if (c < '0' || c > '9') {
+                break;
+            }
+            digits.value = digits.value * 10 + (c - '0');
+        }
+        return digits;
+    }
+
+    static bool IsSpace(char c) { return c == ' ' || c == '\t' || c == '\n' || c == '\r'; }
+    [[nodiscard]] std::size_t Left() const { return static_cast<std::size_t>(end_ - at_); }
+
+    const char *at_;
+    const char *end_;
+    bool escaped_;
+};
+
+} // namespace VANO::FILEINDEX
+
+#endif
