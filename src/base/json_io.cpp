@@ -6,6 +6,7 @@
 #include <sstream>
 
 #include "base/file_io.h"
+#include "base/plain_value.h"
 
 namespace VANO::FILEINDEX {
 
@@ -62,7 +63,12 @@ JsonParser::JsonParser() = default;
 JsonParser::~JsonParser() = default;
 
 bool JsonParser::Parse(Json::Value &value, std::string_view text) {
-    return ParseWithLibrary(value, text);
+    Json::Value parsed;
+    if (!ReadPlainValue(parsed, text)) {
+        return ParseWithLibrary(value, text);
+    }
+    value.swap(parsed);
+    return true;
 }
 
 bool JsonParser::ParseWithLibrary(Json::Value &value, std::string_view text) {
