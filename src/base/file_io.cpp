@@ -1,5 +1,6 @@
 #include "base/file_io.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <climits>
@@ -16,6 +17,7 @@ namespace VANO::FILEINDEX {
 namespace {
 
 constexpr mode_t kNewFileMode = 0644;
+constexpr std::size_t kLeastGrowth = 4096; // of a file that has more than it says
 
 bool WriteAll(int fd, std::string_view text) {
     while (!text.empty()) {
@@ -177,21 +179,30 @@ bool ReadFile(std::string &text, const std::string &path, std::size_t maxBytes) 
         errno = EINVAL;
         return false;
     }
-    text.clear();
-    std::array<char, std::size_t{64} * 1024> buffer;
+    if (static_cast<std::size_t>(info.st_size) > maxBytes) {
+        errno = EFBIG;
+        return false;
+    }
+    // Room for a byte more than there seem to be: the second read finds the end.
+    std::size_t length = 0;
+    text.resize(static_cast<std::size_t>(info.st_size) + 1);
     for (;;) {
-        const ssize_t got = ::read(file.Get(), buffer.data(), buffer.size());
+        const ssize_t got = ::read(file.Get(), text.data() + length, text.size() - length);
         if (got < 0 && errno == EINTR) {
             continue;
         }
         if (got <= 0) {
+            text.resize(length);
             return got == 0;
         }
-        if (text.size() + static_cast<std::size_t>(got) > maxBytes) {
+        length += static_cast<std::size_t>(got);
+        if (length > maxBytes) {
             errno = EFBIG;
             return false;
         }
-        text.append(buffer.data(), static_cast<std::size_t>(got));
+        if (length == text.size()) {
+            text.resize(length + std::max(length, kLeastGrowth));
+        }
     }
 }
 

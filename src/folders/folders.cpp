@@ -54,7 +54,7 @@ bool Folders::Load() {
         Folder folder;
         // A folder whose path no longer resolves keeps its setting.
         (void)folder.Load(path, *member);
-        folders.emplace(path, std::move(folder));
+        folders.emplace_hint(folders.end(), path, std::move(folder)); // they come in order
     }
     return true;
 }

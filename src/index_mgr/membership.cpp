@@ -57,7 +57,16 @@ bool HoldsFolderOfShare(const std::vector<Folder> &folders, const std::string &s
 
 bool IndexMgr::List(std::vector<Folder> &folders) {
     Folders settings;
-    return settings.Load() && settings.List(folders);
+    if (!settings.Load()) {
+        return false;
+    }
+    std::vector<Folder> listed;
+    listed.reserve(settings.folders.size());
+    for (auto &[path, folder] : settings.folders) {
+        listed.push_back(std::move(folder)); // the settings are not needed any more
+    }
+    folders.swap(listed);
+    return true;
 }
 
 bool IndexMgr::IsShareIndexed(const std::string &share) {

@@ -2,7 +2,9 @@
 
 #include <cstring>
 #include <fileindex/error_handler.h>
+#include <string_view>
 #include <sys/stat.h>
+#include <utility>
 
 #include "base/log.h"
 #include "utils/share_of_full_path.h"
@@ -58,9 +60,10 @@ bool GetFullPath(std::string &fullPath, const std::string &sharePath) {
         fullPath.clear();
         return false;
     }
-    const std::string directory = share->path;
     // The share part keeps the spelling of the request, whatever the platform's is.
-    fullPath = directory.substr(0, directory.rfind('/')) + sharePath;
+    const std::string_view directory = share->path;
+    std::string resolved(directory.substr(0, directory.rfind('/')));
+    fullPath = std::move(resolved += sharePath);
     return true;
 }
 
