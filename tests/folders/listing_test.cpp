@@ -444,6 +444,84 @@ TEST_F(ListingTest, FactsAreAskedInTheOrderOfThePage) {
                                    "VANOGetFSType(/volume1/photos/a, 0)"));
 }
 
+// --- the facts of a whole page ------------------------------------------------------------------
+
+class PageStatusTest : public ListingTest {
+  protected:
+    void SetUp() override {
+        ListingTest::SetUp();
+        for (const char *name : {"a", "a/inside", "b", "c"}) {
+            MakeDirs(std::string("/volume1/photos/") + name);
+            Add(std::string("/photos/") + name);
+        }
+    }
+
+    // The status of a, a/inside, b and c.
+    Names Statuses() {
+        Names statuses;
+        const Json::Value page = List(0, 10, "path", "", Json(R"(["status"])"));
+        for (const Json::Value &record : page["folder"]) {
+            statuses.push_back(record["additional"]["status"].asString());
+        }
+        return statuses;
+    }
+
+    static std::string Event(const std::string &path) {
+        return R"({"event":1,"path":"/volume1/photos/)" + path + "\"}\n";
+    }
+
+    static std::size_t TimesOpened(const std::string &file) {
+        const auto &opens = Fault::Log(Call::Open);
+        return static_cast<std::size_t>(std::count_if(
+            opens.begin(), opens.end(), [&](const CallInfo &call) { return call.path == file; }));
+    }
+
+    const std::string queue = "/volume1/photos/@eaDir/VANO@file_index_queue";
+    const std::string malformed = "status_mgr:47 Malformed command: ";
+};
+
+TEST_F(PageStatusTest, EachFolderHasItsOwnStatus) {
+    PutFile(queue, Event("a/inside/x") + Event("bb"));
+    PutFile(queue + ".tmp",
+            R"({"event":256,"path":"/volume2/x","path_old":"/volume1/photos/c/x"})");
+    EXPECT_THAT(Statuses(), ElementsAre("processing", "processing", "finished", "processing"));
+    ExpectLog({});
+}
+
+TEST_F(PageStatusTest, FoldersOfOneShareShareTheScans) {
+    PutFile(queue, Event("a/x"));
+    PutFile(queue + ".tmp", "");
+    Fault::Count(Call::Open);
+    (void)Statuses();
+    EXPECT_EQ(TimesOpened(queue), 1U);
+    EXPECT_EQ(TimesOpened(queue + ".tmp"), 1U);
+}
+
+TEST_F(PageStatusTest, AMalformedLineIsLoggedForEachFolder) {
+    PutFile(queue, "x\n" + Event("b"));
+    PutFile(queue + ".tmp", "y\n");
+    EXPECT_THAT(Statuses(), ElementsAre("finished", "finished", "processing", "finished"));
+    // What waits in the queue itself is not looked for behind it.
+    ExpectLog({malformed + "x", malformed + "y", malformed + "x", malformed + "y", malformed + "x",
+               malformed + "x", malformed + "y"});
+}
+
+TEST_F(PageStatusTest, AQueueThatCannotBeOpenedIsLoggedForEachFolder) {
+    PutFile(queue, Event("a"));
+    Fault::FailPath(Call::Open, queue, EACCES);
+    EXPECT_THAT(Statuses(), ElementsAre("finished", "finished", "finished", "finished"));
+    const std::string line =
+        "status_mgr:37 Failed to open queue=" + queue + ", reason=Permission denied";
+    ExpectLog({line, line, line, line});
+}
+
+TEST_F(PageStatusTest, NothingIsKeptForTheNextPage) {
+    PutFile(queue, Event("a"));
+    EXPECT_THAT(Statuses(), ElementsAre("processing", "finished", "finished", "finished"));
+    PutFile(queue, Event("b"));
+    EXPECT_THAT(Statuses(), ElementsAre("finished", "finished", "processing", "finished"));
+}
+
 } // namespace
 
 } // namespace VANO::TESTS
