@@ -30,12 +30,8 @@ bool IsVerbose() {
     return LOG_LEVEL == 7;
 }
 
-// Whether a re-index of exactly this path waits in the queue file.
-bool IsPathReindexQueued(const std::string &fullPath, const std::string &queueFile) {
-    if (!IsFileExist(queueFile)) {
-        return false;
-    }
-    QueueReader reader(queueFile);
+// Whether a re-index of exactly this path waits in the queue file, which exists.
+bool HoldsReindex(QueueReader &&reader, const std::string &queueFile, const std::string &fullPath) {
     if (!reader.IsOpen()) {
         LogError(kUnit, 95, "Failed to open queue=%s, reason=%s", queueFile.c_str(),
                  ErrnoText().c_str());
@@ -52,24 +48,37 @@ bool IsPathReindexQueued(const std::string &fullPath, const std::string &queueFi
     return false;
 }
 
+// The same of the share's queue and of the one that the daemon took over.
+bool IsReindexQueued(const MetadataEntry &queue, const std::string &queueFile,
+                     const std::string &fullPath) {
+    const std::string taken = queueFile + kTakenQueueSuffix;
+    return (IsFileExist(queueFile) && HoldsReindex(QueueReader(queue), queueFile, fullPath)) ||
+           (IsFileExist(taken) && HoldsReindex(QueueReader(taken), taken, fullPath));
+}
+
+// A queue that was opened, and what it is.
+struct OpenedQueue {
+    UniqueFd fd;
+    struct stat info;
+};
+
 // Users can write beside the queue. Only a regular file is appended to, and none that has a second
 // name: it may be somebody else's file.
-UniqueFd OpenQueue(const MetadataEntry &entry) {
-    UniqueFd queue = entry.Open(O_WRONLY | O_APPEND | O_CREAT, 0666);
-    struct stat info {};
-    if (!queue || ::fstat(queue.Get(), &info) != 0 || !S_ISREG(info.st_mode) || info.st_nlink > 1) {
-        return UniqueFd();
+OpenedQueue OpenQueue(const MetadataEntry &entry) {
+    OpenedQueue queue{entry.Open(O_WRONLY | O_APPEND | O_CREAT, 0666), {}};
+    if (queue.fd && (::fstat(queue.fd.Get(), &queue.info) != 0 || !S_ISREG(queue.info.st_mode) ||
+                     queue.info.st_nlink > 1)) {
+        queue.fd = UniqueFd();
     }
     return queue;
 }
 
 // Between opening the queue and locking it the daemon may have taken it over: what is written to
 // that file then is lost.
-bool IsTakenOver(const UniqueFd &queue, const MetadataEntry &entry) {
-    struct stat opened {};
+bool IsTakenOver(const OpenedQueue &queue, const MetadataEntry &entry) {
     struct stat named {};
-    return ::fstat(queue.Get(), &opened) != 0 || !entry.Stat(named) ||
-           opened.st_dev != named.st_dev || opened.st_ino != named.st_ino;
+    return !entry.Stat(named) || queue.info.st_dev != named.st_dev ||
+           queue.info.st_ino != named.st_ino;
 }
 
 void WriteAndUnlock(const UniqueFd &queue, const std::string &line) {
@@ -83,13 +92,13 @@ void WriteAndUnlock(const UniqueFd &queue, const std::string &line) {
 
 enum class Append { kDone, kBusy, kTakenOver, kFailed };
 
-Append TryToAppend(const std::string &queueFile, const std::string &line) {
-    const MetadataEntry entry(queueFile);
-    const UniqueFd queue = OpenQueue(entry);
-    if (!queue) {
+Append TryToAppend(const MetadataEntry &entry, const std::string &queueFile,
+                   const std::string &line) {
+    const OpenedQueue queue = OpenQueue(entry);
+    if (!queue.fd) {
         return Append::kFailed;
     }
-    if (::flock(queue.Get(), LOCK_EX | LOCK_NB) != 0) {
+    if (::flock(queue.fd.Get(), LOCK_EX | LOCK_NB) != 0) {
         if (IsLockBusy(errno)) {
             return Append::kBusy;
         }
@@ -102,16 +111,16 @@ Append TryToAppend(const std::string &queueFile, const std::string &line) {
     if (IsTakenOver(queue, entry)) {
         return Append::kTakenOver;
     }
-    WriteAndUnlock(queue, line);
+    WriteAndUnlock(queue.fd, line);
     return Append::kDone;
 }
 
 // False when the queue cannot be opened or locked at all. One that only stays busy drops the line,
 // which counts as done.
-bool AppendLine(const std::string &queueFile, const std::string &line) {
+bool AppendLine(const MetadataEntry &entry, const std::string &queueFile, const std::string &line) {
     Append result = Append::kFailed;
     for (int attempt = 0; attempt < kLockAttempts; ++attempt) {
-        result = TryToAppend(queueFile, line);
+        result = TryToAppend(entry, queueFile, line);
         if (result == Append::kDone || result == Append::kFailed) {
             return result == Append::kDone;
         }
@@ -153,11 +162,9 @@ bool QueueEventOnce(std::string &shareName, int event, const std::string &fullPa
     if (!GetQueueLocation(queueFile, shareName, kUnit, 478)) {
         return false;
     }
-    if (IsPathReindexQueued(fullPath, queueFile) ||
-        IsPathReindexQueued(fullPath, queueFile + kTakenQueueSuffix)) {
-        return true;
-    }
-    return AppendLine(queueFile, EventLine(event, fullPath, data));
+    const MetadataEntry queue(queueFile);
+    return IsReindexQueued(queue, queueFile, fullPath) ||
+           AppendLine(queue, queueFile, EventLine(event, fullPath, data));
 }
 
 // A status file of an unexpected shape makes the JSON library throw: the mark is then not set.

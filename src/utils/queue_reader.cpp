@@ -34,7 +34,9 @@ std::unique_ptr<char[]> MakeBuffer(std::size_t size) {
 
 } // namespace
 
-QueueReader::QueueReader(const std::string &path) : file_(MetadataEntry(path).Open(O_RDONLY)) {
+QueueReader::QueueReader(const std::string &path) : QueueReader(MetadataEntry(path)) {}
+
+QueueReader::QueueReader(const MetadataEntry &queue) : file_(queue.Open(O_RDONLY)) {
     struct stat info {};
     if (file_ && (::fstat(file_.Get(), &info) != 0 || !S_ISREG(info.st_mode))) {
         file_ = UniqueFd();

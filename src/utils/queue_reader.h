@@ -13,12 +13,15 @@
 
 namespace VANO::FILEINDEX {
 
+class MetadataEntry;
+
 // Reads a queue file line by line. Memory grows with the longest line alone, not with the file, and
 // ends at 64 MiB: a longer line is cut there and is then no event.
 class QueueReader {
   public:
     // Opens a share's queue, a regular file; no symbolic link in the share is followed to it.
     explicit QueueReader(const std::string &path);
+    explicit QueueReader(const MetadataEntry &queue);
 
     // Whether the queue could be opened; errno says why not.
     [[nodiscard]] bool IsOpen() const { return static_cast<bool>(file_); }
