@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
-# The packages bear the project's version, and the library packages that of the binary interface.
+# What debian/ says agrees with the project: its version, that of the binary interface, and the
+# libraries that it is built with.
 #
-# Usage: package_version_test.sh SOURCE-DIR VERSION ABI-VERSION
+# Usage: packaging_test.sh SOURCE-DIR VERSION ABI-VERSION
 set -euo pipefail
 cd "$1"
 version=$2
@@ -16,4 +17,10 @@ for library in libfileindex libvanoplatform; do
     grep -q "^Package: $library$abi\$" debian/control || fail "debian/control has no $library$abi"
     grep -q "^$library\.so\.$abi $library$abi " "$symbols" || fail "$symbols is of another interface"
 done
+
+# The lists that stand in parentheses, or between a field and the next.
+needed=$(sed -n '/^readonly BUILD=(/,/)/p' scripts/install-deps | grep -o 'lib[a-z0-9.+-]*-dev')
+declared=$(sed -n '/^Build-Depends:/,/^[A-Z].*:/p' debian/control | grep -o 'lib[a-z0-9.+-]*-dev')
+missing=$(comm -23 <(sort -u <<<"$needed") <(sort -u <<<"$declared"))
+[ -z "$missing" ] || fail "Build-Depends in debian/control lacks $missing"
 echo "packages of $version, binary interface $abi"
