@@ -25,7 +25,7 @@ struct Options {
     JsonMode json = JsonMode::kOff;
 };
 
-std::string StateText(const ShareState &share) {
+std::string StateText(const ShareFacts &share) {
     std::string text = share.directory.empty() ? "no such share" : "";
     if (share.isOutOfSpace) {
         text += (text.empty() ? "" : ", ") + std::string("out of space");
@@ -36,7 +36,7 @@ std::string StateText(const ShareState &share) {
     return text;
 }
 
-Json::Value AsJson(const ShareState &share) {
+Json::Value AsJson(const ShareFacts &share) {
     Json::Value value(Json::objectValue);
     value["name"] = share.name;
     value["directory"] = share.directory;
@@ -46,17 +46,17 @@ Json::Value AsJson(const ShareState &share) {
     return value;
 }
 
-void PrintNames(const std::vector<ShareState> &shares) {
-    for (const ShareState &share : shares) {
+void PrintNames(const std::vector<ShareFacts> &shares) {
+    for (const ShareFacts &share : shares) {
         std::cout << share.name << '\0';
     }
 }
 
-void PrintShares(const std::vector<ShareState> &shares, JsonMode json) {
+void PrintShares(const std::vector<ShareFacts> &shares, JsonMode json) {
     Json::Value answer(Json::objectValue);
     answer["share"] = Json::Value(Json::arrayValue);
     Table table({"SHARE", "DIRECTORY", "FOLDERS", "STATE"});
-    for (const ShareState &share : shares) {
+    for (const ShareFacts &share : shares) {
         table.Add(
             {share.name, share.directory, std::to_string(share.folders.size()), StateText(share)});
         answer["share"].append(AsJson(share));
@@ -69,7 +69,7 @@ void PrintShares(const std::vector<ShareState> &shares, JsonMode json) {
 }
 
 ExitCode Run(const Options &options) {
-    std::vector<ShareState> shares;
+    std::vector<ShareFacts> shares;
     if (!ListShares(shares)) {
         return Fail("Cannot list the shares");
     }

@@ -95,7 +95,7 @@ ExitCode Change(const Options &options, const Mark &mark) {
 }
 
 ExitCode Run(const Options &options, const Mark &mark) {
-    ShareState share;
+    ShareFacts share;
     if (!LookUpShare(share, options.share)) {
         return Fail("Cannot look up share " + Shown(options.share));
     }

@@ -52,7 +52,7 @@ std::string CountText(const std::vector<Folder> &folders) {
 }
 
 ExitCode RunRemove(const ShareOptions &options) {
-    ShareState share;
+    ShareFacts share;
     const std::string what = "the folders of share " + Shown(options.share);
     if (!LookUpShare(share, options.share)) {
         return Fail("Cannot remove " + what);
@@ -90,7 +90,7 @@ ExitCode PreviewRename(const RenameOptions &options, const std::vector<Folder> &
 }
 
 ExitCode RunRename(const RenameOptions &options) {
-    ShareState share;
+    ShareFacts share;
     const std::string what = Shown(options.old) + " to " + Shown(options.now);
     if (!LookUpShare(share, options.old)) {
         return Fail("Cannot move the folders of " + what);

@@ -53,8 +53,8 @@ void AddNamesOfFolders(std::set<std::string> &names, Folders &settings) {
     }
 }
 
-ShareState StateOf(const std::string &name, Folders &settings) {
-    ShareState share;
+ShareFacts StateOf(const std::string &name, Folders &settings) {
+    ShareFacts share;
     share.name = name;
     share.directory = ToFullPath("/" + name);
     (void)settings.List(share.folders, name); // always true
@@ -65,7 +65,7 @@ ShareState StateOf(const std::string &name, Folders &settings) {
 
 } // namespace
 
-bool ListShares(std::vector<ShareState> &shares) {
+bool ListShares(std::vector<ShareFacts> &shares) {
     Folders settings;
     Json::Value status;
     if (!settings.Load() || !LoadStatus(status)) {
@@ -82,7 +82,7 @@ bool ListShares(std::vector<ShareState> &shares) {
     return true;
 }
 
-bool LookUpShare(ShareState &share, const std::string &name) {
+bool LookUpShare(ShareFacts &share, const std::string &name) {
     Folders settings;
     Json::Value status;
     if (!settings.Load() || !LoadStatus(status)) {

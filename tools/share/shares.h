@@ -7,7 +7,7 @@
 
 namespace CTL {
 
-struct ShareState {
+struct ShareFacts {
     std::string name;
     std::string directory; // empty when no share has that name
     std::vector<VANO::FILEINDEX::Folder> folders;
@@ -17,10 +17,10 @@ struct ShareState {
 
 // Every share that has folder settings or marks, and those of the share table where the system has
 // one, in byte order. False when the settings cannot be read.
-[[nodiscard]] bool ListShares(std::vector<ShareState> &shares);
+[[nodiscard]] bool ListShares(std::vector<ShareFacts> &shares);
 
 // Of a single share, whether there is one of that name or not.
-[[nodiscard]] bool LookUpShare(ShareState &share, const std::string &name);
+[[nodiscard]] bool LookUpShare(ShareFacts &share, const std::string &name);
 
 } // namespace CTL
 
