@@ -10,6 +10,10 @@
 namespace peer {
 
 bool ParseJson(Json::Value &value, std::string_view text) {
+    // The JSON library takes the text to end there, and does not look at what follows.
+    if (text.find('\0') != std::string_view::npos) {
+        return false;
+    }
     Json::CharReaderBuilder builder;
     Json::CharReaderBuilder::strictMode(&builder.settings_);
     builder["strictRoot"] = false;

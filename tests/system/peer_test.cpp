@@ -204,6 +204,15 @@ TEST_F(PeerTest, AnEventBehindATornLineIsFound) {
                                      "event 4 " + Printed(2)));
 }
 
+// A power failure can leave zero bytes where a line should have been.
+TEST_F(PeerTest, AnEventBehindZeroBytesIsFound) {
+    const std::string torn = EventLine(7).substr(0, EventLine(7).size() - 1);
+    PutFile(kQueue, torn + std::string(3, '\0') + EventLine(1));
+    Start();
+    EXPECT_TRUE(Eventually([] { return !Events().empty(); }));
+    EXPECT_THAT(Events(), ElementsAre(Printed(1)));
+}
+
 TEST_F(PeerTest, PathsCannotForgeLines) {
     PutFile(kQueue, R"({"data":null,"event":1,"path":"/volume1/photos/a\nevent 9"})");
     Start();
@@ -361,6 +370,7 @@ INSTANTIATE_TEST_SUITE_P(
                       Garbage{"NoZeroByte", Length(2) + "{}", "no zero byte at the end"},
                       Garbage{"NoJson", Message("{"), "no JSON"},
                       Garbage{"TwoValues", Message("{}{}"), "no JSON"},
+                      Garbage{"ZeroByte", Message(std::string("{}\0{", 4)), "no JSON"},
                       Garbage{"TooDeep", Message(std::string(5000, '[')), "no JSON"},
                       Garbage{"NoObject", Message("[]"), "no command"},
                       Garbage{"NoType", Message(R"({"data":{}})"), "no command"},
