@@ -16,6 +16,14 @@ if(FILEINDEX_SANITIZE)
     add_link_options(-fsanitize=${FILEINDEX_SANITIZE})
 endif()
 
+# Every module tells libFuzzer what it ran through; only the fuzz targets carry libFuzzer itself.
+if(FILEINDEX_BUILD_FUZZ)
+    if(NOT CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
+        message(FATAL_ERROR "FILEINDEX_BUILD_FUZZ needs clang: libFuzzer is part of it")
+    endif()
+    add_compile_options(-fsanitize=fuzzer-no-link)
+endif()
+
 # Warnings belong to this project's targets alone and never reach a caller's build.
 function(fileindex_warnings target)
     target_compile_options(${target} PRIVATE -Wall -Wextra -Wpedantic -Wshadow -Wconversion)

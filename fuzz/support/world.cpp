@@ -1,0 +1,185 @@
+#include "support/world.h"
+
+#include <algorithm>
+#include <array>
+#include <cstdint>
+#include <cstring>
+#include <dirent.h>
+#include <fcntl.h>
+#include <memory>
+#include <sys/file.h>
+#include <sys/socket.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include <fileindex/config.h>
+#include <fileindex/error_handler.h>
+
+#include "base/unique_fd.h"
+#include "support/check.h"
+#include "support/event_trace.h"
+#include "support/fake_platform.h"
+#include "support/files.h"
+#include "support/log_tap.h"
+#include "support/naive.h"
+
+namespace VANO::FUZZ {
+
+namespace {
+
+using FILEINDEX::UniqueFd;
+using TESTS::FakePlatform;
+
+constexpr char kSettingsDirectory[] = "/usr/vano/etc/fileindex";
+constexpr char kSocket[] = "/var/run/fileindexd.sock";
+constexpr int kBacklog = 4096;
+constexpr const char *kLocks[] = {"/tmp/fileidx_cfg_folder.lock", "/tmp/fileidx_cfg_status.lock"};
+
+UniqueFd Listen() {
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    std::memcpy(address.sun_path, kSocket, sizeof(kSocket));
+    (void)::unlink(kSocket);
+    UniqueFd listener(::socket(AF_UNIX, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0));
+    Check(::bind(listener.Get(), reinterpret_cast<const sockaddr *>(&address), sizeof(address)) ==
+                  0 &&
+              ::listen(listener.Get(), kBacklog) == 0,
+          "the daemon's socket can be made");
+    return listener;
+}
+
+// Made once, with the first input.
+struct World {
+    World() {
+        RequireSandbox();
+        FakePlatform &platform = FakePlatform::Get();
+        platform.Reset();
+        for (const std::string &share : ShareNames()) {
+            platform.AddShare(share, "/volume1/" + share);
+            for (const char *folder : {"/a", "/2016"}) {
+                TESTS::MakeDirs("/volume1/" + share + folder);
+            }
+            TESTS::MakeDirs("/volume1/" + share + "/@eaDir");
+        }
+        TESTS::MakeDirs(kSettingsDirectory);
+        listener = Listen();
+    }
+
+    UniqueFd listener;
+};
+
+World &TheWorld() {
+    static World &world = *new World;
+    return world;
+}
+
+Descriptors DescriptorsOfTheWorld() {
+    (void)TheWorld();
+    return {};
+}
+
+std::string ReadToEnd(const UniqueFd &connection) {
+    std::string text;
+    std::array<char, 4096> buffer;
+    ssize_t got = 0;
+    while ((got = ::read(connection.Get(), buffer.data(), buffer.size())) > 0) {
+        text.append(buffer.data(), static_cast<std::size_t>(got));
+    }
+    return text;
+}
+
+Json::Value CommandIn(const std::string &message) {
+    std::uint32_t length = 0;
+    Check(message.size() > sizeof(length), "a message has a length and a text", message);
+    std::memcpy(&length, message.data(), sizeof(length));
+    Check(length == message.size() - sizeof(length) && message.back() == '\0',
+          "a message is as long as it says and ends with a zero byte", message);
+    const std::string text = message.substr(sizeof(length), length - 1);
+    const auto command = Parse(text);
+    // A request can be nested so deep that a message around it is too deep for any reader.
+    if (!command &&
+        std::count(text.begin(), text.end(), '[') + std::count(text.begin(), text.end(), '{') >=
+            1000) {
+        return {};
+    }
+    Check(command && command->isObject() && command->size() == 2 && command->isMember("data") &&
+              (*command)["type"].isString(),
+          "a command is an object with a type and data", text);
+    return *command;
+}
+
+bool IsLocked(const char *path) {
+    const UniqueFd file(::open(path, O_RDWR | O_CLOEXEC));
+    return file && ::flock(file.Get(), LOCK_EX | LOCK_NB) != 0;
+}
+
+void CheckNoStrayFile() {
+    const std::unique_ptr<DIR, int (*)(DIR *)> directory(::opendir(kSettingsDirectory), ::closedir);
+    while (const dirent *entry = ::readdir(directory.get())) {
+        const std::string name = entry->d_name;
+        Check(name[0] == '.' || name == "folder.conf" || name == "status.conf",
+              "no other file is left beside the settings", name);
+    }
+}
+
+} // namespace
+
+const std::vector<std::string> &ShareNames() {
+    static const std::vector<std::string> &names =
+        *new std::vector<std::string>{"photos", "music", "a", "Фото"};
+    return names;
+}
+
+std::string QueueOf(const std::string &share) {
+    return "/volume1/" + share + "/@eaDir/VANO@file_index_queue";
+}
+
+Run::Run() : descriptors_(DescriptorsOfTheWorld()) {
+    for (const std::string &share : ShareNames()) {
+        (void)::unlink(QueueOf(share).c_str());
+        (void)::unlink((QueueOf(share) + ".tmp").c_str());
+    }
+    (void)::unlink(kFolderConf);
+    (void)::unlink(kStatusConf);
+    FakePlatform::Get().monitorCalls.clear();
+    FakePlatform::Get().spotlight = false;
+    TESTS::EventTrace::Get().Clear();
+    FILEINDEX::ErrorHandler::SetError(FILEINDEX::FILEINDEX_ERR_NONE);
+    (void)LogTap::Take();
+}
+
+Run::~Run() {
+    (void)Commands();
+    descriptors_.CheckNoneLeft();
+    Check(FakePlatform::Get().LiveRecords() == 0, "every share record is released");
+    Check(FakePlatform::Get().Violations().empty(), "the platform is called as it wants to be");
+    for (const char *lock : kLocks) {
+        Check(!IsLocked(lock), "every lock is released", lock);
+    }
+    CheckNoStrayFile();
+}
+
+std::vector<Json::Value> Run::Commands() {
+    std::vector<Json::Value> commands;
+    for (;;) {
+        const UniqueFd connection(
+            ::accept4(TheWorld().listener.Get(), nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC));
+        if (!connection) {
+            return commands;
+        }
+        commands.push_back(CommandIn(ReadToEnd(connection)));
+    }
+}
+
+void Put(const std::string &path, const std::string &text) {
+    const UniqueFd file(::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0644));
+    Check(::write(file.Get(), text.data(), text.size()) == static_cast<ssize_t>(text.size()),
+          "the world's files can be written", path);
+}
+
+std::string Get(const std::string &path) {
+    const UniqueFd file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    return file ? ReadToEnd(file) : std::string();
+}
+
+} // namespace VANO::FUZZ
