@@ -163,6 +163,28 @@ void JsonGrammar::Change(Json::Value &document) {
     }
 }
 
+// Writes a character in another way that JSON has for it.
+std::string JsonGrammar::Escape(std::string text) {
+    static constexpr std::array<std::pair<char, const char *>, 3> kForms = {
+        {{'/', "\\/"}, {'/', "\\u002f"}, {'p', "\\u0070"}}};
+    const auto &[character, form] = kForms[Below(kForms.size())];
+    const std::size_t at = text.find(character, Below(text.size() + 1));
+    return at == std::string::npos ? text : text.replace(at, 1, form);
+}
+
+// Puts something beside a bracket, comma or colon that a reader may take for JSON and should not.
+std::string JsonGrammar::Spoil(std::string text) {
+    static const std::array<std::string, 8> kSpoilers = {
+        ",", "/**/", "//\n", std::string(1, '\0'), "}", " x", "\xEF\xBB\xBF", "\v"};
+    std::vector<std::size_t> places{0, text.size()};
+    for (std::size_t i = text.find_first_of("{}[],:"); i != std::string::npos;
+         i = text.find_first_of("{}[],:", i + 1)) {
+        places.push_back(i);
+        places.push_back(i + 1);
+    }
+    return text.insert(places[Below(places.size())], kSpoilers[Below(kSpoilers.size())]);
+}
+
 std::string JsonGrammar::Mutate(const std::string &text, std::size_t maxSize) {
     std::optional<Json::Value> document = Parse(text);
     if (!document || OnceIn(16)) {
@@ -172,6 +194,12 @@ std::string JsonGrammar::Mutate(const std::string &text, std::size_t maxSize) {
         Change(*document);
     }
     std::string changed = Text(*document);
+    if (OnceIn(8)) {
+        changed = Escape(changed);
+    }
+    if (OnceIn(16)) {
+        changed = Spoil(changed);
+    }
     return changed.size() <= maxSize ? changed : MutateBytes(text, maxSize);
 }
 

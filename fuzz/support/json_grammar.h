@@ -12,7 +12,8 @@ namespace VANO::FUZZ {
 
 // Changes JSON texts by their grammar: values are replaced, members added, dropped and renamed,
 // parts nested and copied, with the names and the numbers that the library's documents are made of.
-// What comes out is JSON, but now and then bytes are changed at will.
+// What comes out is JSON, but now and then something is put between its parts that is no JSON, or
+// bytes are changed at will.
 class JsonGrammar {
   public:
     explicit JsonGrammar(unsigned seed) : random_(seed) {}
@@ -45,6 +46,8 @@ class JsonGrammar {
     void ChangeMembers(Json::Value &value);
     void Nest(Json::Value &value);
     void Rename(const Place &place);
+    std::string Escape(std::string text);
+    std::string Spoil(std::string text);
     Json::Value NewValue();
     std::string NewText();
 
