@@ -18,6 +18,7 @@ using namespace VANO::FILEINDEX;
 using namespace VANO::FUZZ;
 
 constexpr char kShare[] = "photos";
+const std::string kLongerName("photos\0x", 8); // no share's, and not to be taken for one's
 
 bool IsMarked(const Json::Value &conf, const char *kind) {
     return conf.isObject() && conf[kind].isObject() && conf[kind].isMember(kShare);
@@ -108,6 +109,7 @@ void CheckMark(const std::string &text, const Json::Value &conf, const char *kin
     if (const auto marked = Write(text, [set] { return set(kShare, true); })) {
         Check(ask(kShare), "a marked share is marked", kind);
         CheckOthers(conf, *marked, kind);
+        Check(set(kLongerName, false) && ask(kShare), "and stays so", kind);
     }
     if (const auto cleared = Write(text, [set] { return set(kShare, false); })) {
         Check(!ask(kShare), "a share whose mark is cleared is not marked", kind);

@@ -21,9 +21,12 @@ bool IsShareMarked(const Json::Value &root, const char *kind, const std::string 
 }
 
 void ClearShareMark(Json::Value &root, const char *kind, const std::string &share) {
-    if (root.isMember(kind)) {
-        root[kind].removeMember(share);
+    if (!root.isMember(kind) || !root[kind].isMember(share)) {
+        return;
     }
+    // With both ends: otherwise the name of another share, cut at a zero byte, would be removed.
+    Json::Value removed;
+    root[kind].removeMember(share.data(), share.data() + share.size(), &removed);
 }
 
 } // namespace

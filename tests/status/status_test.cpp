@@ -199,6 +199,14 @@ TEST_F(StatusTest, UnmarkingAnUnknownShareSucceeds) {
     EXPECT_EQ(status.root, Json(R"({"no_space":{"b":true},"need_reindex":{"b":true}})"));
 }
 
+TEST_F(StatusTest, UnmarkingANameWithAZeroByteLeavesTheShorterOne) {
+    const std::string longer("a\0b", 3);
+    status.root = Json(R"({"no_space":{"a":true,"a\u0000b":true},"need_reindex":{"a":true}})");
+    EXPECT_TRUE(status.ShareSetNoSpace(longer, false));
+    EXPECT_TRUE(status.ShareSetNeedReindex(longer, false));
+    EXPECT_EQ(status.root, Json(R"({"no_space":{"a":true},"need_reindex":{"a":true}})"));
+}
+
 TEST_F(StatusTest, AMarkIsAPresentKeyWhateverItsValue) {
     for (const char *value : {"true", "false", "null", "0", "\"\"", "{}"}) {
         status.root = Json(std::string(R"({"no_space":{"a":)") + value +
