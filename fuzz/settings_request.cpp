@@ -68,7 +68,9 @@ class Model {
             if (!element.isConvertibleTo(Json::stringValue) || element.asString().empty()) {
                 return false;
             }
-            changed.removeMember(element.asString());
+            const std::string path = element.asString();
+            Json::Value removed; // by its length: the name may hold a zero byte
+            changed.removeMember(path.data(), path.data() + path.size(), &removed);
         }
         settings_ = changed;
         return true;

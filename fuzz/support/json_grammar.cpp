@@ -28,7 +28,7 @@ constexpr std::array kWords = {
     "upsert",   "delete",      "reindex",    "update",     "/volume1/photos/a",
     "get",      "command",     "folders",    "steps",      "/volume1/music/2016",
     "Ünï",      "ßtraße",      "\xff\xfe",   "..",         "/volume2/Photos",
-    ".",        "//",          "#recycle",   "@eaDir",     "/volume1/photos/2016/b"};
+    ".",        "/..",         "#recycle",   "@eaDir",     "/volume1/photos/2016/b"};
 
 } // namespace
 
@@ -116,8 +116,11 @@ void JsonGrammar::ChangeMembers(Json::Value &value) {
 void JsonGrammar::ChangeValue(Json::Value &value) {
     if ((value.isArray() || value.isObject()) && !OnceIn(8)) {
         ChangeMembers(value);
-    } else if (value.isString() && OnceIn(2)) {
+    } else if (value.isString() && OnceIn(3)) {
         value = MutateBytes(value.asString(), value.asString().size() + 8);
+    } else if (value.isString() && OnceIn(2)) {
+        std::string text = value.asString();
+        value = text.insert(Below(text.size() + 1), NewText());
     } else {
         value = NewValue();
     }
