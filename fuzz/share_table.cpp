@@ -84,6 +84,14 @@ void CheckRecord(const std::string &name, const std::string &path) {
           "its properties are told", name);
 }
 
+// The name of an entry that breaks a rule finds nothing, or a share that it is another spelling of.
+void CheckLeftOut(const Json::Value &table, const std::map<std::string, std::string> &shares) {
+    for (const std::string &name : table.getMemberNames()) {
+        const Record share = Find(name);
+        Check(!share || shares.count(share->name) != 0, "a bad entry is left out", name);
+    }
+}
+
 // The share that holds a full path: the one with the longest directory.
 std::string NaiveShareOf(const std::map<std::string, std::string> &shares,
                          const std::string &fullPath) {
@@ -160,6 +168,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
         }
         CheckFullPath(shares, path.substr(0, path.rfind('/')));
         names.push_back(name);
+    }
+    if (table && table->isObject()) {
+        CheckLeftOut(*table, shares);
     }
     CheckOrder(table && table->isObject() ? table->getMemberNames() : names);
     Check(!Find("surely not in the table"), "there are no other shares");
