@@ -53,7 +53,7 @@ int Run(int argc, char **argv) {
     try {
         app.parse(argc, argv);
     } catch (const CLI::Success &help) {
-        return app.exit(help);
+        return CTL::IsCommandUnknown(app) ? CTL::SayMistake(app, help) : app.exit(help);
     } catch (const CLI::ParseError &mistake) {
         return CTL::SayMistake(app, mistake);
     }

@@ -63,6 +63,12 @@ void SayUnexpected(const CLI::App &app, const std::string &word) {
 
 } // namespace
 
+bool IsCommandUnknown(const CLI::App &app) {
+    const CLI::App &innermost = Innermost(app);
+    const auto unexpected = innermost.remaining();
+    return !unexpected.empty() && !IsOption(unexpected.front()) && !CommandsOf(innermost).empty();
+}
+
 ExitCode SayMistake(const CLI::App &app, const CLI::ParseError &mistake) {
     const CLI::App &innermost = Innermost(app);
     // What nobody took explains best what is missing.

@@ -52,6 +52,9 @@ INSTANTIATE_TEST_SUITE_P(
     ::testing::Values(
         Mistake{"NoCommand", {}, "subcommand is required"},
         Mistake{"UnknownCommand", {"frobnicate"}, "There is no command 'frobnicate'"},
+        Mistake{
+            "HelpOnUnknownCommand", {"frobnicate", "--help"}, "There is no command 'frobnicate'"},
+        Mistake{"HelpOnUnknownShareCommand", {"share", "nap", "-h"}, "There is no command 'nap'"},
         Mistake{"AbbreviatedCommand", {"rem", "/photos"}, "Did you mean 'remove'?"},
         Mistake{"UnknownOption", {"list", "--nonsense"}, "no option '--nonsense'"},
         Mistake{"AddNothing", {"add", "--all"}, "PATH is required"},
