@@ -79,7 +79,7 @@ class CompletionTest : public CtlTest, public ::testing::WithParamInterface<Shel
 TEST_P(CompletionTest, OffersTheCommands) {
     EXPECT_THAT(Offers({""}),
                 IsSupersetOf({"list", "show", "add", "set", "remove", "reindex", "pause", "resume",
-                              "query", "share", "marks", "migrate"}));
+                              "query", "share", "marks", "migrate", "status", "watch", "doctor"}));
     EXPECT_THAT(Offers({"re"}), UnorderedElementsAre("remove", "reindex", "resume"));
     EXPECT_THAT(Offers({"share", "re"}), UnorderedElementsAre("remove", "rename", "resume"));
     EXPECT_THAT(Offers({"marks", ""}), UnorderedElementsAre("list", "set"));

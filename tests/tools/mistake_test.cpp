@@ -31,7 +31,7 @@ INSTANTIATE_TEST_SUITE_P(Commands, HelpTest,
                                            "status", "watch", "share\nrename", "share\nremove",
                                            "share\nclean", "share\npause", "share\nresume",
                                            "share\nno-space", "share\nneed-reindex", "marks",
-                                           "marks\nlist", "marks\nset", "migrate"));
+                                           "marks\nlist", "marks\nset", "migrate", "doctor"));
 
 class MistakeTest : public CtlTest, public ::testing::WithParamInterface<Mistake> {};
 
