@@ -109,6 +109,7 @@ std::vector<const Folder *> CutPage(const std::vector<Folder> &sorted, unsigned 
     }
     const unsigned long begin = std::min(offset, total);
     const unsigned long end = begin + std::min(limit, total - begin);
+    page.reserve(end - begin);
     for (unsigned long index = begin; index < end; ++index) {
         page.push_back(&sorted[index]);
     }
@@ -117,6 +118,7 @@ std::vector<const Folder *> CutPage(const std::vector<Folder> &sorted, unsigned 
 
 FolderProgress ProgressOf(const std::vector<const Folder *> &folders) {
     std::vector<std::string> fullPaths;
+    fullPaths.reserve(folders.size());
     for (const Folder *folder : folders) {
         fullPaths.push_back(folder->full_path);
     }
