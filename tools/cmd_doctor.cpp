@@ -72,6 +72,7 @@ ExitCode Run(const Options &options) {
 
 std::vector<std::string> CheckNames() {
     std::vector<std::string> names;
+    names.reserve(kChecks.size());
     for (const Check &check : kChecks) {
         names.emplace_back(check.name);
     }
