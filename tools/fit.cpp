@@ -55,7 +55,7 @@ std::string Fit(const std::string &shown, std::size_t columns, const Style &styl
     }
     const std::string gap = style.isUtf8 ? "…" : "...";
     if (columns <= Columns(gap)) {
-        return std::string(columns, '.');
+        return std::string(columns, '.'); // NOLINT(modernize-return-braced-init-list): a count
     }
     const std::vector<std::string> characters = CharactersOf(shown);
     std::size_t room = columns - Columns(gap);
@@ -84,7 +84,7 @@ std::string Fit(const std::string &shown, std::size_t columns, const Style &styl
 std::string Bar(double fraction, std::size_t columns, const Style &style) {
     const std::size_t frame = style.isUtf8 ? 0 : 2;
     if (columns <= frame) {
-        return std::string(columns, ' ');
+        return std::string(columns, ' '); // NOLINT(modernize-return-braced-init-list): a count
     }
     const std::size_t inside = columns - frame;
     const double wanted = std::floor(std::clamp(fraction, 0.0, 1.0) * static_cast<double>(inside));

@@ -89,7 +89,8 @@ void FindOddOwner(Findings &findings, const std::string &path, const struct stat
 void FindStrayFiles(Findings &findings, const std::string &directory, const std::string &prefix,
                     const std::string &suffix) {
     for (const std::string &name : NamesIn(directory)) {
-        const std::string path = directory + "/" + name;
+        std::string path = directory;
+        path.append("/").append(name);
         const FileLook look(path);
         const long long age = std::time(nullptr) - look.info.st_mtime;
         if (!IsTemporary(name, prefix, suffix) || !look.IsRegular() || age < kSecondsOfAWriter) {

@@ -52,7 +52,7 @@ void LookAtTable(Findings &findings, const Machine &machine) {
         findings.push_back((machine.HasFolders()
                                 ? Error("share-table-missing", kShareTable, what)
                                 : Warning("share-table-missing", kShareTable, what))
-                               .Mend("Write one: {\"photos\": \"/volume1/photos\"}",
+                               .Mend(R"(Write one: {"photos": "/volume1/photos"})",
                                      std::string("editor ") + kShareTable));
         return;
     }
