@@ -37,7 +37,7 @@ std::string BracketsRaised(const std::string &text) {
         raised.append(text, position, end + 2 - position);
         position = text.find_first_not_of(' ', end + 3);
     }
-    return raised.append(text, position, std::string::npos);
+    return raised + text.substr(position);
 }
 
 void PrintRow(const std::vector<std::string> &cells, const std::vector<std::size_t> &widths) {

@@ -110,7 +110,7 @@ ExitCode Run(const Options &options, const Mark &mark) {
 }
 
 std::shared_ptr<Options> AddMarkOptionsTo(CLI::App &app) {
-    const auto options = std::make_shared<Options>();
+    auto options = std::make_shared<Options>();
     AddShareTo(app, "SHARE", options->share, "Name of the share");
     CLI::Option *set = app.add_flag("--set", options->set, "Set the mark");
     app.add_flag("--clear", options->clear, "Clear the mark")->excludes(set);

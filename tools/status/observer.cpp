@@ -20,8 +20,8 @@ std::vector<FileStamp> StampSettings() {
     return {FileStamp(fileindex::Folders().GetPath()), FileStamp(fileindex::Status().GetPath())};
 }
 
-bool Contains(const std::string &folder, const std::string &path) {
-    return fileindex::StringStartWith(path + "/", folder + "/");
+bool Contains(const std::string &above, const std::string &below) {
+    return fileindex::StringStartWith(below + "/", above + "/");
 }
 
 ObservedShare &ShareOf(std::vector<ObservedShare> &shares, const std::string &path) {
