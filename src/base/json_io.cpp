@@ -57,6 +57,14 @@ bool HasLibraryExtension(std::string_view text) {
     return false;
 }
 
+std::string WriteWithLibrary(const Json::Value &value) {
+    std::ostringstream text;
+    text.exceptions(std::ios::badbit); // without memory it would just end early
+    const std::unique_ptr<Json::StreamWriter> writer(WriterSettings().newStreamWriter());
+    writer->write(value, &text);
+    return text.str();
+}
+
 } // namespace
 
 JsonParser::JsonParser() = default;
@@ -109,11 +117,11 @@ bool JsonToFile(const Json::Value &value, const std::string &path) {
 }
 
 std::string JsonToString(const Json::Value &value) {
-    std::ostringstream text;
-    text.exceptions(std::ios::badbit); // without memory it would just end early
-    const std::unique_ptr<Json::StreamWriter> writer(WriterSettings().newStreamWriter());
-    writer->write(value, &text);
-    return text.str();
+    std::string text;
+    if (!WritePlainValue(text, value)) {
+        text = WriteWithLibrary(value);
+    }
+    return text;
 }
 
 std::string JsonToMessageText(const Json::Value &value) {

@@ -9,6 +9,8 @@
 
 namespace VANO::FILEINDEX {
 
+constexpr int kMaxPlainDepth = 16; // far below what the JSON library refuses
+
 // Walks through a JSON text token by token, as long as it is plain: no escapes, no fractions, no
 // numbers beyond 18 digits, no deep nesting. That is what settings and events are made of, and what
 // every JSON library reads alike.
@@ -38,6 +40,25 @@ class PlainJson {
         }
         at_ += characters.size();
         return true;
+    }
+
+    // A whole object or array: `takeItem` takes one thing that stands between its commas.
+    template <typename TakeItem>
+    [[nodiscard]] bool TakeBetween(char open, char close, TakeItem takeItem) {
+        if (depth_ == kMaxPlainDepth || !Take(open)) {
+            return false;
+        }
+        if (Take(close)) {
+            return true;
+        }
+        ++depth_;
+        do {
+            if (!takeItem()) {
+                return false;
+            }
+        } while (Take(','));
+        --depth_;
+        return Take(close);
     }
 
     [[nodiscard]] bool TakeString(std::string_view &value) {
@@ -94,6 +115,7 @@ class PlainJson {
     const char *at_;
     const char *end_;
     bool escaped_;
+    int depth_ = 0;
 };
 
 } // namespace VANO::FILEINDEX

@@ -8,32 +8,14 @@ namespace VANO::FILEINDEX {
 
 namespace {
 
-constexpr int kMaxDepth = 16; // far below what the JSON library refuses
+bool SkipValue(PlainJson &json);
 
-bool SkipValue(PlainJson &json, int depth);
-
-bool SkipMember(PlainJson &json, int depth) {
+bool SkipMember(PlainJson &json) {
     std::string_view name;
-    return json.TakeString(name) && json.Take(':') && SkipValue(json, depth);
+    return json.TakeString(name) && json.Take(':') && SkipValue(json);
 }
 
-// An object or array: `skip` skips one thing that stands between its commas.
-bool SkipAll(PlainJson &json, int depth, char open, char close, bool (*skip)(PlainJson &, int)) {
-    if (depth == kMaxDepth || !json.Take(open)) {
-        return false;
-    }
-    if (json.Take(close)) {
-        return true;
-    }
-    do {
-        if (!skip(json, depth + 1)) {
-            return false;
-        }
-    } while (json.Take(','));
-    return json.Take(close);
-}
-
-bool SkipValue(PlainJson &json, int depth) {
+bool SkipValue(PlainJson &json) {
     std::string_view text;
     std::int64_t number = 0;
     switch (json.Next()) {
@@ -46,9 +28,9 @@ bool SkipValue(PlainJson &json, int depth) {
     case 'n':
         return json.TakeExactly("null");
     case '{':
-        return SkipAll(json, depth, '{', '}', SkipMember);
+        return json.TakeBetween('{', '}', [&] { return SkipMember(json); });
     case '[':
-        return SkipAll(json, depth, '[', ']', SkipValue);
+        return json.TakeBetween('[', ']', [&] { return SkipValue(json); });
     default:
         return json.TakeInteger(number);
     }
@@ -83,7 +65,7 @@ struct Draft {
         }
         std::string_view name;
         return json.TakeString(name) && name != "path" && name != "event" && name != "path_old" &&
-               json.Take(':') && SkipValue(json, 0);
+               json.Take(':') && SkipValue(json);
     }
 };
 

@@ -42,17 +42,20 @@ TEST_P(JsonValidTextTest, IsRead) {
 
 INSTANTIATE_TEST_SUITE_P(
     Texts, JsonValidTextTest,
-    ::testing::Values(TextRow{"Object", R"({"a":1})"}, TextRow{"EmptyObject", "{}"},
-                      TextRow{"EmptyArray", "[]"}, TextRow{"Array", "[1,[2],{}]"},
-                      TextRow{"String", R"("text")"}, TextRow{"Number", "12"},
-                      TextRow{"Negative", "-1.5e3"}, TextRow{"True", "true"},
-                      TextRow{"Null", "null"}, TextRow{"SpaceAround", " \t\r\n{ } \t\r\n"},
-                      TextRow{"SlashInAString", R"({"/photos//a":"/* no comment */"})"},
-                      TextRow{"CommaAndBraceInAString", R"({"a":",}"})"},
-                      TextRow{"EscapedQuoteInAString", R"({"a":"\",}//"})"},
-                      TextRow{"EscapedBackslashAtTheEnd", R"({"a":"\\"})"},
-                      TextRow{"EmptyName", R"({"":1})"}, TextRow{"NotUtf8", "{\"\xff\":\"\xc3\"}"},
-                      TextRow{"Depth", Nested(900)}),
+    ::testing::Values(
+        TextRow{"Object", R"({"a":1})"}, TextRow{"EmptyObject", "{}"}, TextRow{"EmptyArray", "[]"},
+        TextRow{"Array", "[1,[2],{}]"}, TextRow{"String", R"("text")"}, TextRow{"Number", "12"},
+        TextRow{"Negative", "-1.5e3"}, TextRow{"True", "true"}, TextRow{"Null", "null"},
+        TextRow{"SpaceAround", " \t\r\n{ } \t\r\n"},
+        TextRow{"SlashInAString", R"({"/photos//a":"/* no comment */"})"},
+        TextRow{"CommaAndBraceInAString", R"({"a":",}"})"},
+        TextRow{"EscapedQuoteInAString", R"({"a":"\",}//"})"},
+        TextRow{"EscapedBackslashAtTheEnd", R"({"a":"\\"})"}, TextRow{"EmptyName", R"({"":1})"},
+        TextRow{"NotUtf8", "{\"\xff\":\"\xc3\"}"}, TextRow{"Depth", Nested(900)},
+        // What the JSON library takes beyond the standard.
+        TextRow{"LeadingZero", R"({"a":007})"}, TextRow{"NegativeZeros", "-007"},
+        TextRow{"RawTabInAString", "\"a\tb\""}, TextRow{"RawNewlineInAName", "{\"a\nb\":1}"},
+        TextRow{"ZeroByteInAString", std::string("\"a\0b\"", 5)}),
     RowName());
 
 class JsonInvalidTextTest : public JsonIoTest, public ::testing::WithParamInterface<TextRow> {};
@@ -120,9 +123,8 @@ TEST_F(JsonIoTest, TextIsCompactOnOneLineWithoutNewline) {
     EXPECT_EQ(JsonToString(Json::Value()), "null");
 }
 
-TEST_F(JsonIoTest, ATextForWhichThereIsNoMemoryIsNotCutShort) {
-    Json::Value value(Json::objectValue);
-    value["name"] = std::string(5000, 'x');
+// Whether the text of `value` is whole, or thrown away, whichever request for memory is refused.
+void ExpectWholeTextWithoutMemory(const Json::Value &value) {
     const std::string whole = JsonToString(value);
     long refused = 0;
     long requests = 0;
@@ -138,6 +140,14 @@ TEST_F(JsonIoTest, ATextForWhichThereIsNoMemoryIsNotCutShort) {
         EXPECT_TRUE(text == whole) << "refused " << refused << ": " << text.size() << " bytes";
     } while (requests >= refused);
     EXPECT_GT(refused, 1) << "nothing was refused";
+}
+
+TEST_F(JsonIoTest, ATextForWhichThereIsNoMemoryIsNotCutShort) {
+    Json::Value value(Json::objectValue);
+    value["name"] = std::string(5000, 'x');
+    ExpectWholeTextWithoutMemory(value);
+    value["other"] = "\n"; // which only the JSON library writes
+    ExpectWholeTextWithoutMemory(value);
 }
 
 TEST_F(JsonIoTest, NewlinesInAStringAreEscaped) {
