@@ -71,11 +71,11 @@ bool CollectFacts(Json::Value &facts, const Folder &folder, const Json::Value &k
     if (!keys.isArray()) {
         return RefuseKeys(97, keys);
     }
-    for (const Json::Value &element : keys) {
-        if (!element.isString()) {
-            return RefuseKeys(104, element);
+    for (Json::ArrayIndex index = 0; index < keys.size(); ++index) { // an iterator skips holes
+        if (!keys[index].isString()) {
+            return RefuseKeys(104, keys[index]);
         }
-        const std::string key = element.asString();
+        const std::string key = keys[index].asString();
         if (!GetFact(facts[key], folder, key, progress)) {
             LogError(kUnit, 110, "Failed to get additional: %s", key.c_str());
         }

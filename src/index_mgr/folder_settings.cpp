@@ -74,7 +74,8 @@ struct Touched {
 
 bool ApplyUpserts(Touched &touched, Folders &settings, const Json::Value &request) {
     Json::Value report;
-    for (const Json::Value &element : request) {
+    for (Json::ArrayIndex index = 0; index < request.size(); ++index) { // an iterator skips holes
+        const Json::Value &element = request[index];
         if (!settings.Upsert(report, element)) {
             LogError(kIndexMgrUnit, __LINE__, "Upsert failed, folder=%s",
                      JsonToMessageText(element).c_str());
@@ -119,7 +120,8 @@ bool QueueChanges(const std::map<std::string, Json::Value> &reports) {
 // `lastReport` holds the report of the last path that could be resolved, under that path.
 bool ApplyDeletes(std::set<std::string> &shares, Json::Value &lastReport, Folders &settings,
                   const Json::Value &request) {
-    for (const Json::Value &element : request) {
+    for (Json::ArrayIndex index = 0; index < request.size(); ++index) {
+        const Json::Value &element = request[index];
         if (!element.isConvertibleTo(Json::stringValue)) {
             return RefuseParameter(__LINE__, "Bad param", JsonToMessageText(element));
         }
@@ -188,7 +190,8 @@ bool SettleShares(const std::set<std::string> &shares) {
 // a share is indexed is asked once: each time folder.conf is read.
 bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
     std::set<std::string> checked;
-    for (const Json::Value &element : paths) {
+    for (Json::ArrayIndex index = 0; index < paths.size(); ++index) {
+        const Json::Value &element = paths[index];
         if (!element.isString()) {
             return RefuseParameter(__LINE__, "Malformed jsArrPath", JsonToMessageText(element));
         }

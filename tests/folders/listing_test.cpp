@@ -385,6 +385,17 @@ TEST_F(ListingTest, AnElementThatIsNoStringEndsTheList) {
     }
 }
 
+TEST_F(ListingTest, AHoleInTheListIsNoString) {
+    const Folder folder = Add("/photos/trip");
+    Json::Value keys(Json::arrayValue);
+    keys[1] = "status";
+    Json::Value out;
+    EXPECT_FALSE(folder.GetAdditional(out, keys));
+    EXPECT_EQ(out, Json("{}"));
+    ExpectLog({"folder:104 Bad param: null"});
+    ExpectError(FILEINDEX_ERR_BAD_PARAM);
+}
+
 TEST_F(ListingTest, WhatIsNoListIsABadParameter) {
     const Folder folder = Add("/photos/trip");
     for (const std::string keys :
@@ -513,6 +524,21 @@ TEST_F(PageStatusTest, AQueueThatCannotBeOpenedIsLoggedForEachFolder) {
     const std::string line =
         "status_mgr:37 Failed to open queue=" + queue + ", reason=Permission denied";
     ExpectLog({line, line, line, line});
+}
+
+// Its folder has no full path, which is no folder to scan for.
+TEST_F(PageStatusTest, AFolderOfAGoneShareChangesNothingForTheOthers) {
+    platform.AddShare("gone", "/volume1/gone");
+    MakeDirs("/volume1/gone/x");
+    Add("/gone/x");
+    platform.RemoveShare("gone");
+    PutFile(queue, Event("a/inside/x"));
+    Fault::Count(Call::Open);
+    EXPECT_THAT(Statuses(),
+                ElementsAre("paused", "processing", "processing", "finished", "finished"));
+    EXPECT_EQ(TimesOpened(queue), 1U);
+    ExpectLog({"utils:191 GetFullPath failed, path=/gone/x"});
+    ErrorHandler::SetError(FILEINDEX_ERR_NONE);
 }
 
 TEST_F(PageStatusTest, NothingIsKeptForTheNextPage) {

@@ -297,6 +297,17 @@ TEST_F(DeleteTest, AnElementThatIsNoTextIsABadParameterAndNothingIsSaved) {
     }
 }
 
+TEST_F(DeleteTest, AHoleInTheRequestIsAnElementWithoutAShare) {
+    Json::Value request(Json::arrayValue);
+    request[1] = "/photos/a";
+    Watch();
+    EXPECT_FALSE(IndexMgr::Delete(request));
+    ExpectLog({"utils:389 GetShareNameByPath failed, path=",
+               "index_mgr:* GetShareNameByPath failed, path="});
+    EXPECT_THAT(Steps(), IsEmpty());
+    EXPECT_THAT(StoredPaths(), ElementsAreArray(kStored));
+}
+
 TEST_F(DeleteTest, AnElementWithoutAShareEndsTheOperationUnsaved) {
     for (const char *element : {R"("")", "null"}) {
         SCOPED_TRACE(element);

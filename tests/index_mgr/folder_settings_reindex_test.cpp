@@ -110,6 +110,16 @@ TEST_F(ReindexTest, AnElementThatIsNoStringIsMalformedAndNothingIsQueued) {
     }
 }
 
+TEST_F(ReindexTest, AHoleInTheRequestIsMalformed) {
+    Json::Value request(Json::arrayValue);
+    request[1] = "/photos/a";
+    Watch();
+    EXPECT_FALSE(IndexMgr::Reindex(request));
+    ExpectError(FILEINDEX_ERR_BAD_PARAM);
+    ExpectLog({"index_mgr:* Malformed jsArrPath: null"});
+    EXPECT_THAT(Steps(), IsEmpty());
+}
+
 TEST_F(ReindexTest, AnEmptyPathHasNoShare) {
     Watch();
     EXPECT_FALSE(IndexMgr::Reindex(Paths({"/photos/a", ""})));

@@ -325,6 +325,15 @@ TEST_P(UpsertBadElementTest, IsABadParameterAndNothingIsSaved) {
     EXPECT_THAT(StoredPaths(), ElementsAre("/photos/old"));
 }
 
+TEST_F(UpsertTest, AHoleInTheRequestIsABadElement) {
+    Json::Value request(Json::arrayValue);
+    request[1]["path"] = "/photos/a";
+    EXPECT_FALSE(IndexMgr::Upsert(request));
+    ExpectError(FILEINDEX_ERR_BAD_PARAM);
+    ExpectLog({"folders:129 Bad param: null", "index_mgr:* Upsert failed, folder=null"});
+    EXPECT_FALSE(Exists(kFolderFile));
+}
+
 INSTANTIATE_TEST_SUITE_P(
     Rows, UpsertBadElementTest,
     ::testing::Values(
@@ -715,8 +724,8 @@ TEST_F(UpsertTest, AnExceptionBelowAnEntryPointForCIsAFailure) {
         throw std::runtime_error("the platform fails");
     });
     EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a"}])")));
-    ExpectLog({"index_mgr:24 FILEIDXQueuePathGet failed, share=photos",
-               "index_mgr:96 UpsertVANtifydCfg failed, share=photos"});
+    ExpectLog({"index_mgr:* FILEIDXQueuePathGet failed, share=photos",
+               "index_mgr:* UpsertVANtifydCfg failed, share=photos"});
     EXPECT_FALSE(IsLocked(kFolderLock));
     EXPECT_EQ(platform.LiveRecords(), 0U);
 }

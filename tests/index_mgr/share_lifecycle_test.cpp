@@ -251,7 +251,7 @@ TEST_F(ShareRenameTest, ANewNameThatIsNoShareFailsAndLeavesTheFile) {
 TEST_F(ShareRenameTest, AFailureOfALaterRecordLeavesTheFile) {
     PutFolders({"/photo/a", "/photo/b", "/video/c"});
     Watch();
-    // Each record resolves its new path twice; the share vanishes after the first record.
+    // Each record resolves its new path three times; the share vanishes after the first record.
     int found = 0;
     platform.On("VANOShareGet", [&](const std::string &entry) -> std::optional<int> {
         return entry == "VANOShareGet(pictures)" && ++found > 3 ? std::optional<int>(-1)
