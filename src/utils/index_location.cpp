@@ -72,12 +72,12 @@ ShareRecord WriteLocation(const Location &location, const char *shareName, char 
 }
 
 // Users can write to the share: nothing is made behind a symbolic link. A path that was cut to the
-// caller's buffer names no place in the metadata directory any more; it is made as it stands.
-bool MakeDatabase(const std::string &path) {
-    static const std::string kWhole = std::string("/") + kMetadataDirName + "/" + kIndexDbName;
-    const bool isWhole = path.size() >= kWhole.size() &&
-                         path.compare(path.size() - kWhole.size(), kWhole.size(), kWhole) == 0;
-    return isWhole ? MetadataEntry(path).MakeDirectory(0777) : ::mkdir(path.c_str(), 0777) == 0;
+// caller's buffer may name no place in the metadata directory any more; it is made as it stands.
+bool MakeDatabase(const std::string &sharePath, const std::string &path) {
+    const std::string metadataDir = sharePath + "/" + kMetadataDirName + "/";
+    const bool isInside = path.size() > metadataDir.size() &&
+                          path.compare(0, metadataDir.size(), metadataDir) == 0;
+    return isInside ? MetadataEntry(path).MakeDirectory(0777) : ::mkdir(path.c_str(), 0777) == 0;
 }
 
 } // namespace
@@ -92,7 +92,7 @@ int FILEIDXDBPathGet(const char *szName, char *szOutDBPath, int cbOutLen) {
         if (!share) {
             return -1;
         }
-        if (!MakeDatabase(szOutDBPath) && errno != EEXIST) {
+        if (!MakeDatabase(share->path, szOutDBPath) && errno != EEXIST) {
             LogError(kUnit, 750, "mkdir failed, path=%s, reason=%s", szOutDBPath,
                      ErrnoText().c_str());
         }

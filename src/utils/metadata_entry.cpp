@@ -59,7 +59,7 @@ bool MetadataEntry::MakeDirectory(mode_t mode) const {
 }
 
 bool MetadataEntry::IsObstructed() const {
-    return failure_ == ENOTDIR || failure_ == ELOOP;
+    return failure_ != 0 && failure_ != ENOENT;
 }
 
 } // namespace VANO::FILEINDEX

@@ -25,7 +25,8 @@ class MetadataEntry {
     [[nodiscard]] bool Stat(struct stat &info) const;
     [[nodiscard]] bool MakeDirectory(mode_t mode) const;
 
-    // Whether something that is no directory, a symbolic link at most, stands in the way.
+    // Whether something stands in the way: what is no directory, a symbolic link at most, or a
+    // failure that keeps from seeing the way. A way that is not there is not obstructed.
     [[nodiscard]] bool IsObstructed() const;
 
   private:

@@ -84,6 +84,11 @@ bool MakeDatabase() {
     return FILEIDXDBPathGet("photos", path.data(), static_cast<int>(path.size())) > 0;
 }
 
+bool MakeCutDatabase() {
+    std::array<char, sizeof("/volume1/photos/@eaDir/VANO")> path{};
+    return FILEIDXDBPathGet("photos", path.data(), static_cast<int>(path.size())) > 0;
+}
+
 bool AskStatus() {
     return StatusMgr::GetFolderStatus("/photos/trip") != "processing";
 }
@@ -153,6 +158,7 @@ TEST_P(LinkedShareTest, NothingOutsideIsReadIntoTheLog) {
 TEST_P(LinkedShareTest, NoDatabaseIsMadeThroughALink) {
     SwapForLink(GetParam());
     EXPECT_TRUE(MakeDatabase()); // the location itself is known all the same
+    EXPECT_TRUE(MakeCutDatabase());
     ExpectOutsideUntouched();
     (void)TakeLog();
 }
@@ -175,16 +181,22 @@ TEST_F(HostileShareTest, NothingIsRemovedThroughALink) {
         EventTrace::Get().Clear();
         EXPECT_TRUE(IndexMgr::CleanShareIndexData("photos"));
         EXPECT_THAT(Effects(), Each(Not(HasSubstr("/bin/rm"))));
-        const std::vector<std::string> log = TakeLog();
-        EXPECT_EQ(std::count_if(log.begin(), log.end(),
-                                [](const std::string &text) {
-                                    return text.find("Refused to remove") != std::string::npos;
-                                }),
-                  3);
+        EXPECT_THAT(TakeLog(), ::testing::Contains(HasSubstr("Refused to remove")).Times(3));
         fs::remove(level.path);
         fs::rename(std::string(level.path) + ".away", level.path);
     }
     ExpectOutsideUntouched();
+}
+
+TEST_F(HostileShareTest, NothingIsRemovedUnseen) {
+    for (const int error : {EMFILE, ENFILE, ENOMEM, EACCES, EIO}) {
+        EventTrace::Get().Clear();
+        Fault::FailAlways(Call::OpenPath, error);
+        EXPECT_TRUE(IndexMgr::CleanShareIndexData("photos"));
+        EXPECT_THAT(Effects(), Each(Not(HasSubstr("/bin/rm")))) << error;
+        Fault::Reset();
+        EXPECT_THAT(TakeLog(), ::testing::Contains(HasSubstr("Refused to remove")).Times(3));
+    }
 }
 
 TEST_F(HostileShareTest, ALinkInPlaceOfTheQueueIsItselfRemoved) {
@@ -195,8 +207,7 @@ TEST_F(HostileShareTest, ALinkInPlaceOfTheQueueIsItselfRemoved) {
     ExpectOutsideUntouched();
 }
 
-// --- somebody else's file in place of the queue
-// ------------------------------------------------------
+// --- somebody else's file in place of the queue ----------------------------------------------
 
 TEST_F(HostileShareTest, AnotherNameOfSomebodysFileIsNotAppendedTo) {
     PutFile("/volume1/precious", "precious\n");
