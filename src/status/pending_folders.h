@@ -9,7 +9,8 @@
 namespace VANO::FILEINDEX {
 
 // Tells, of some folders, which have events at or below them. Folders may lie in one another; an
-// event costs a binary search, however many there are. No folder's path has a zero byte.
+// event costs a binary search, however many there are. A folder whose path
+// has a zero byte is never asked about: it cannot be indexed.
 class PendingFolders {
   public:
     explicit PendingFolders(std::vector<std::string> fullPaths);
