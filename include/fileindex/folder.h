@@ -22,8 +22,7 @@ class Folder {
     /// @param path share path ("/share/dir").
     /// @param obj  object in the form that asJson() gives; anything else counts as empty.
     /// @return false when `path` cannot be resolved, as GetFullPath() of share_path.h says; the
-    /// record
-    ///         is loaded all the same, with an empty `full_path`.
+    ///         record is loaded all the same, with an empty `full_path`.
     FILEINDEX_API bool Load(const std::string &path, const Json::Value &obj);
 
     /// Load() into a record whose name and file types were first set to empty and false.
@@ -31,14 +30,12 @@ class Folder {
 
     /// Makes `path` the record's share path and resolves it.
     ///
-    /// @return false when it cannot be resolved, as GetFullPath() of share_path.h says; `full_path`
-    /// is
-    ///         then empty.
+    /// @return false when it cannot be resolved, as GetFullPath() of share_path.h says;
+    ///         `full_path` is then empty.
     FILEINDEX_API bool SetPath(const std::string &path);
 
     /// @return the folder's absolute file-system path: the cached one, or `path` resolved now.
-    /// Empty
-    ///         when it cannot be resolved; then one line is logged. The cache is not filled.
+    ///         Empty when it cannot be resolved; then one line is logged. The cache is not filled.
     FILEINDEX_API std::string GetFullPath() const;
 
     /// @return the JSON object of this record.

@@ -82,8 +82,7 @@ class IndexMgr {
     /// @param request array of share paths as stored in folder.conf; one that is not set is no
     ///        error.
     /// @return false at the first failing step. A request that is no array, or an element that is
-    /// an
-    ///         array or an object, is FILEINDEX_ERR_BAD_PARAM and changes nothing.
+    ///         an array or an object, is FILEINDEX_ERR_BAD_PARAM and changes nothing.
     FILEINDEX_API static bool Delete(const Json::Value &request);
 
     /// Queues folders for a new index and revives those of their shares that ran out of space.
@@ -153,8 +152,7 @@ class IndexMgr {
     /// its worker ("revive_share_worker"). Takes no lock and leaves the status file alone.
     ///
     /// @return false when the configuration cannot be written, or the daemon not be reached
-    /// (nothing
-    ///         is logged).
+    ///         (nothing is logged).
     FILEINDEX_API static bool ShareResume(const std::string &share);
 
     /// Deletes the share's event queue, the queue that the daemon took over, and the index

@@ -41,8 +41,8 @@ class FILEINDEX_API Status : public Config {
 
     /// @param resume_time receives -1 when not paused, 0 for a pause without end, otherwise the
     ///                    end of the pause in seconds since the epoch, which may have passed.
-    /// @return false when the stored value is no integer; one line is logged and `resume_time` left
-    ///         unwritten. Nothing throws.
+    /// @return false when the stored value cannot be converted to a signed 64-bit integer; one line
+    ///         is logged and `resume_time` left unwritten. Nothing throws.
     bool GetPauseInfo(long long &resume_time);
 
     /// Marks a share as out of space, or clears the mark. Marking one that is not yet marked runs

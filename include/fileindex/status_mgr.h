@@ -59,7 +59,7 @@ class StatusMgr {
     /// queue files and the clock; the daemon is not asked. Costs a scan of the share's queue.
     ///
     /// @param path share path of the folder.
-    /// @return "finished" (also when the state cannot be told, with one line logged),
+    /// @return "finished" (also when the state cannot be told, which is logged),
     ///         "processing", "paused" (also for a folder that cannot be indexed) or "err_no_space".
     FILEINDEX_API static std::string GetFolderStatus(const std::string &path);
 

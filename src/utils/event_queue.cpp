@@ -87,7 +87,7 @@ void WriteAndUnlock(const UniqueFd &queue, const std::string &line) {
         LogError(kUnit, 502, "write fail, (%ld, %ld)", static_cast<long>(written),
                  static_cast<long>(line.size()));
     }
-    (void)::flock(queue.Get(), LOCK_UN);
+    (void)::flock(queue.Get(), LOCK_UN); // closing it does the same
 }
 
 enum class Append { kDone, kBusy, kTakenOver, kFailed };

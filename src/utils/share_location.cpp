@@ -17,7 +17,7 @@ bool GetLocation(std::string &location, PathGet get, const std::string &share) {
         return false;
     }
     const int length = get(share.c_str(), buffer, sizeof(buffer));
-    // A path that fills the buffer was cut: it names something else.
+    // A path that fills the buffer may have been cut: it would name something else.
     if (length < 0 || length >= static_cast<int>(sizeof(buffer)) - 1) {
         return false;
     }
