@@ -346,6 +346,8 @@ TEST_F(ConfigTest, AFreeLockIsTakenAtTheFirstAttempt) {
         ASSERT_EQ(Fault::Calls(Call::Flock), 1U);
         EXPECT_EQ(Fault::Log(Call::Flock)[0].number, (exclusive ? LOCK_EX : LOCK_SH) | LOCK_NB);
         EXPECT_EQ(Fault::Calls(Call::Usleep), 0U);
+        EXPECT_EQ(::fcntl(settings.lock_fd, F_GETFD), FD_CLOEXEC)
+            << "a program that the caller starts would keep the lock";
         settings.Unlock();
     }
     ExpectError(FILEINDEX_ERR_NONE);

@@ -154,6 +154,21 @@ TEST_F(ProgressTest, AnUnknownQueueLocationReadsAsFinished) {
                "status_mgr:100 FILEIDXQueuePathGet failed, share=photos"});
 }
 
+// What fills the buffer may be the beginning of another path.
+TEST_F(ProgressTest, AQueueLocationThatIsTooLongReadsAsFinished) {
+    PutFile(kQueue, kWaiting);
+    platform.AnswerAlways("VANOEAMKDir", 0);
+    int asked = 0;
+    platform.On("VANOShareGet", [&](const std::string &) -> std::optional<int> {
+        if (++asked == 3) { // for the location
+            platform.FindShare("photos")->path = "/volume1/" + std::string(4080, 'x');
+        }
+        return std::nullopt;
+    });
+    EXPECT_EQ(StatusOf(), "finished");
+    ExpectLog({"status_mgr:100 FILEIDXQueuePathGet failed, share=photos"});
+}
+
 TEST_F(ProgressTest, AFolderThatNoLongerResolvesIsInNoQueue) {
     PutFile(kQueue, kWaiting);
     PutFile(kTaken, kWaiting);

@@ -268,6 +268,18 @@ TEST_F(StatusMgrTest, APauseEndsHoursFromNowIn32Bits) {
     }
 }
 
+TEST_F(StatusMgrTest, APauseCountsFromBeforeItHeldTheLock) {
+    DaemonPeer daemon;
+    Fault::Record(Call::Time);
+    Watch();
+    EXPECT_TRUE(StatusMgr::Pause(1));
+    const std::vector<std::string> effects = Effects();
+    ASSERT_GE(effects.size(), 2U);
+    EXPECT_EQ(effects[0].rfind("time(", 0), 0U) << effects[0];
+    EXPECT_EQ(effects[1], Locked());
+    EXPECT_EQ(Fault::Calls(Call::Time), 1U);
+}
+
 TEST_F(StatusMgrTest, ANegativePauseTouchesNothing) {
     DaemonPeer daemon;
     for (const int hours : {-1, INT_MIN}) {

@@ -43,6 +43,7 @@ void FakePlatform::Reset() {
     calls_.clear();
     violations_.clear();
     records_.clear();
+    monitorQueues_ = 0;
     ignoreCase = false;
     fileSystemType = 1;
     remoteType = 2;
@@ -109,6 +110,16 @@ std::vector<std::string> FakePlatform::Trace() {
 std::size_t FakePlatform::Calls(const std::string &function) {
     const Lock lock(Mutex());
     return calls_[function];
+}
+
+void FakePlatform::AddMonitorQueue(int count) {
+    const Lock lock(Mutex());
+    monitorQueues_ += count;
+}
+
+int FakePlatform::LiveMonitorQueues() {
+    const Lock lock(Mutex());
+    return monitorQueues_;
 }
 
 std::size_t FakePlatform::LiveRecords() {
@@ -415,9 +426,13 @@ int VANOSMBSetSpotlight(bool enable) {
 
 namespace VANO::VANOTIFYD {
 
-MonitorQueue::MonitorQueue(const Json::Value &newDescription) : description(newDescription) {}
+MonitorQueue::MonitorQueue(const Json::Value &newDescription) : description(newDescription) {
+    FakePlatform::Get().AddMonitorQueue(1);
+}
 
-MonitorQueue::~MonitorQueue() = default;
+MonitorQueue::~MonitorQueue() {
+    FakePlatform::Get().AddMonitorQueue(-1);
+}
 
 bool MonitorQueue::Upsert(const MonitorQueue &queue, const std::string &consumer,
                           _tag_monitor_queue_type_ type) {

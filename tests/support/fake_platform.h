@@ -77,6 +77,7 @@ class FakePlatform {
     // Share records that were handed out and not released, and calls that no platform stands: a
     // record released twice, null pointers, argument lists without their end.
     std::size_t LiveRecords();
+    int LiveMonitorQueues(); // likewise, of objects
     std::vector<std::string> Violations();
 
     // What the platform is like.
@@ -100,6 +101,7 @@ class FakePlatform {
                              bool query = false);
     void Violation(const std::string &text);
     void AddMonitorCall(MonitorCall call);
+    void AddMonitorQueue(int count);
     _tag_VANOSHARE *NewRecord(const FakeShare &share);
     void FreeRecord(_tag_VANOSHARE *record);
 
@@ -112,6 +114,7 @@ class FakePlatform {
     std::map<std::string, Hook> hooks_;
     std::map<std::string, std::size_t> calls_;
     std::set<_tag_VANOSHARE *> records_;
+    int monitorQueues_ = 0;
     std::vector<std::string> violations_;
 };
 

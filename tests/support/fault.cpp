@@ -552,6 +552,7 @@ int connect(int fd, const sockaddr *address, socklen_t length) {
         CallInfo info = OfFd(Call::Connect, fd, static_cast<long>(length));
         if (address != nullptr && address->sa_family == AF_UNIX) {
             info.path = reinterpret_cast<const sockaddr_un *>(address)->sun_path;
+            info.data = address;
         }
         if (const auto result = Enter(info)) {
             return static_cast<int>(*result);

@@ -68,7 +68,7 @@ struct CallInfo {
     int fd = -1;                // where the call takes one
     long number = 0;            // open flags, flock operation, mode, microseconds, option name ...
     std::size_t size = 0;       // read and write; a hook may make it smaller
-    const void *data = nullptr; // write's buffer, setsockopt's value
+    const void *data = nullptr; // write's buffer, setsockopt's value, connect's address
 
     // What a recorded call looks like: "write(/tmp/x, 12)".
     [[nodiscard]] std::string Text() const;

@@ -71,6 +71,7 @@ void LibraryTest::TearDown() {
         EXPECT_NE(::fcntl(fd, F_GETFD), -1) << "closed a descriptor of others: " << target;
     }
     EXPECT_EQ(platform.LiveRecords(), 0U) << "share records were not released";
+    EXPECT_EQ(platform.LiveMonitorQueues(), 0) << "monitor queues were not destroyed";
     EXPECT_THAT(platform.Violations(), ::testing::IsEmpty());
     if (!strayFilesAllowed_) {
         EXPECT_THAT(NamesIn(kSettingsDirectory),

@@ -151,6 +151,10 @@ TEST_F(DaemonSocketTest, ConnectsWithTheWholeAddress) {
     Fault::On(Call::Connect, [](CallInfo &info) -> std::optional<long> {
         EXPECT_EQ(info.path, "/var/run/fileindexd.sock");
         EXPECT_EQ(info.number, 110);
+        sockaddr_un expected{}; // zeros behind the path
+        expected.sun_family = AF_UNIX;
+        (void)info.path.copy(expected.sun_path, sizeof(expected.sun_path) - 1);
+        EXPECT_EQ(std::memcmp(info.data, &expected, sizeof(expected)), 0);
         int type = 0;
         socklen_t size = sizeof(type);
         EXPECT_EQ(::getsockopt(info.fd, SOL_SOCKET, SO_TYPE, &type, &size), 0);

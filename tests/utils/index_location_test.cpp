@@ -138,6 +138,8 @@ TEST_P(IndexLocationTest, BadArgumentsAreNamedInOrder) {
         EXPECT_EQ(Get(row.share, row.out, row.size), -1) << row.condition;
         EXPECT_THAT(platform.Trace(), ElementsAre("log: " + message, "VLIBCErrSetEx(0x0D00)"));
         EXPECT_EQ(platform.lastError, 0x0D00);
+        EXPECT_EQ(platform.lastErrorFile, "utils.cpp");
+        EXPECT_EQ(platform.lastErrorLine, GetParam().argumentLine);
         EXPECT_STREQ(out, "x");
         ExpectLog({message});
         ExpectError(FILEINDEX_ERR_NONE);

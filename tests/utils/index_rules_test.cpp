@@ -145,6 +145,11 @@ TEST_F(IndexRulesTest, OnlyTheAnswerOneMeansAHiddenDirectory) {
     EXPECT_TRUE(IsSystemPreservedFileName("name"));
 }
 
+TEST_F(IndexRulesTest, ThePlatformIsAskedBeforeTheListOfNames) {
+    EXPECT_TRUE(IsSystemPreservedFileName(".DS_Store"));
+    EXPECT_THAT(platform.Trace(), ElementsAre("VANOEAIsHiddenDir(.DS_Store)"));
+}
+
 // --- left out of the index ---
 
 class SkipTest : public IndexRulesTest {};
@@ -343,6 +348,14 @@ TEST_F(FullPathTest, TheChecksRunInTheirOrder) {
                     "VANOShareGet(photos)", "VLIBShareIsEncryptedGet(photos)",
                     "VLIBShareIsReadOnlyGet(photos)", "VANOFSDirIsMntPoint(/volume1/photos)",
                     "realpath(/volume1/photos)", "VANOShareFree(photos)"));
+}
+
+TEST_F(FullPathTest, TheRecycleBinIsAskedAboutBeforeTheSnapshot) {
+    const std::string path = "/volume1/photos/#snapshot/#recycle";
+    platform.snapshotPaths = {path};
+    EXPECT_FALSE(CanFullPathBeIndexed(path));
+    EXPECT_THAT(platform.Trace(), ElementsAre("VANOShareIsShareRecycle(" + path + ")",
+                                              "VLIBFhsPathInSnapshot(" + path + ")"));
 }
 
 TEST_F(FullPathTest, ARecycleBinIsRefusedSilentlyBeforeAnythingElse) {
