@@ -75,8 +75,8 @@ ShareRecord WriteLocation(const Location &location, const char *shareName, char 
 // caller's buffer may name no place in the metadata directory any more; it is made as it stands.
 bool MakeDatabase(const std::string &sharePath, const std::string &path) {
     const std::string metadataDir = sharePath + "/" + kMetadataDirName + "/";
-    const bool isInside = path.size() > metadataDir.size() &&
-                          path.compare(0, metadataDir.size(), metadataDir) == 0;
+    const bool isInside =
+        path.size() > metadataDir.size() && path.compare(0, metadataDir.size(), metadataDir) == 0;
     return isInside ? MetadataEntry(path).MakeDirectory(0777) : ::mkdir(path.c_str(), 0777) == 0;
 }
 
