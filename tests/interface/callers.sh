@@ -39,6 +39,10 @@ cmake --build "$work/cmake" >"$work/build.log" || { cat "$work/build.log"; fail 
 echo "== by pkg-config"
 mkdir "$work/pkgconfig"
 [ -z "$library" ] || flags+=" -Wl,-rpath-link,$library"
+# shellcheck disable=SC2016 # no command, but a fence
+sed -n '/^```c$/,/^```$/{//!p}' "$source/README.md" >"$work/readme.c"
+# shellcheck disable=SC2086
+gcc -std=c11 -Wall -Wextra -Werror "$work/readme.c" $flags -o "$work/readme"
 # shellcheck disable=SC2086
 gcc -std=c11 -Wall -Wextra -Werror "$source/examples/membership.c" $flags \
     -o "$work/pkgconfig/membership"
@@ -59,4 +63,7 @@ for flavour in cmake pkgconfig; do
     "$work/$flavour/membership" /volume1/photos/2016 || fail "$flavour: not indexed after it was added"
     "$work/$flavour/membership" /volume1/photos2 && fail "$flavour: a sibling is indexed"
 done
+echo "== run: the program of the README"
+[ "$("$work/readme" /volume1/photos/2016)" = "/volume1/photos/2016: indexed" ] ||
+    fail "the README's program says something else"
 echo "all as it should be"

@@ -106,7 +106,7 @@ TEST_P(CompletionTest, OffersTheValuesOfAnOption) {
 
 TEST_P(CompletionTest, OffersTheConfiguredFolders) {
     Save(kTwo);
-    for (const char *command : {"show", "set", "remove", "reindex"}) {
+    for (const char *command : {"show", "set", "remove", "reindex", "status", "watch"}) {
         EXPECT_THAT(Offers({command, ""}), UnorderedElementsAre("/photos", "/media/films"))
             << command;
         EXPECT_THAT(Offers({command, "/p"}), ElementsAre("/photos")) << command;
@@ -124,6 +124,21 @@ TEST_P(CompletionTest, OffersShares) {
 TEST_P(CompletionTest, OffersSharesAndDirectoriesToAdd) {
     EXPECT_THAT(Offers({"add", "/pho"}), ElementsAre("/photos"));
     EXPECT_THAT(Offers({"add", "/volume1/photos/20"}), ElementsAre("/volume1/photos/2016"));
+}
+
+TEST_P(CompletionTest, OffersTheChecksOfTheDoctor) {
+    EXPECT_THAT(Offers({"doctor", ""}),
+                UnorderedElementsAre("settings", "locks", "shares", "folders", "daemon", "queues",
+                                     "monitor", "spotlight", "room"));
+    EXPECT_THAT(Offers({"doctor", "locks", "s"}),
+                UnorderedElementsAre("settings", "shares", "spotlight"));
+}
+
+TEST_P(CompletionTest, OffersTheMarks) {
+    EXPECT_THAT(Offers({"marks", "set", ""}), IsEmpty());
+    PutFile(kStatus, R"({"step-1":true,"step 2 done":false,"\u0007":true,"resume_time":0})");
+    EXPECT_THAT(Offers({"marks", "set", ""}), UnorderedElementsAre("step-1", "step\\ 2\\ done"));
+    EXPECT_THAT(Offers({"marks", "list", ""}), IsEmpty());
 }
 
 TEST_P(CompletionTest, SurvivesOddNames) {
@@ -152,6 +167,85 @@ TEST_F(CtlTest, BashFindsNamesByTheirQuotedBeginning) {
         EXPECT_EQ(outcome.out, "/photos/a\\ b\n") << typed;
     }
 }
+
+// --- at a prompt ----------------------------------------------------------------------------
+
+// Types at the prompt of a shell, presses Tab, and then the key that has the line written down.
+constexpr char kTypist[] = R"(zmodload zsh/zpty
+export TERM=dumb PATH=$1:$PATH
+rm -f /tmp/line
+zpty shell $2
+zpty -r shell shown '*ready> *'
+zpty -n -w shell $3$'\t\x14'
+while zpty -r shell shown; do :; done
+cat /tmp/line)";
+
+constexpr char kZshSettings[] = R"(autoload -Uz compinit && compinit -u -D
+note() { print -r -- "$BUFFER" >/tmp/line; exit }
+zle -N note && bindkey '^T' note
+PS1='ready> '
+)";
+
+constexpr char kBashSettings[] = R"(
+note() { printf '%s\n' "$READLINE_LINE" >/tmp/line; exit; }
+bind -x '"\C-t": note'
+PS1='ready> '
+)";
+
+struct Typed {
+    const char *line;
+    const char *completed;
+};
+
+// What the line editors do with an offer: they quote it, and find it by its quoted beginning.
+class PromptTest : public CompletionTest {
+  protected:
+    void SetUp() override {
+        if (::access("/bin/zsh", X_OK) != 0) {
+            GTEST_SKIP() << "the typist, /bin/zsh, is not installed";
+        }
+        CompletionTest::SetUp();
+        PutFile("/tmp/.zshrc", "fpath=(" COMPLETIONS " $fpath)\n" + std::string(kZshSettings));
+        PutFile("/tmp/bashrc", ". " COMPLETIONS "/fileindexctl.bash" + std::string(kBashSettings));
+    }
+
+    static std::string AfterTab(const std::string &line) {
+        const std::string tool = FILEINDEXCTL_PATH;
+        const bool isBash = std::string(GetParam().name) == "Bash";
+        return RunToEnd(
+                   {"/bin/zsh", "-f", "-c", kTypist, "typist", tool.substr(0, tool.rfind('/')),
+                    isBash ? "bash --noprofile --rcfile /tmp/bashrc -i" : "ZDOTDIR=/tmp zsh -d -i",
+                    line})
+            .out;
+    }
+};
+
+TEST_P(PromptTest, TabCompletesTheLine) {
+    Save(R"({"/photos/a b":{},"/photos/it's (new) & old":{}})");
+    PutFile(kStatus, R"({"step 1":true})");
+    const Typed rows[] = {
+        {"sta", "status "},
+        {"list --share p", "list --share photos "},
+        {"list --sort=pat", "list --sort=path "},
+        {"set /photos --photo y", "set /photos --photo yes "},
+        {"doctor loc", "doctor locks "},
+        {"marks set st", R"(marks set step\ 1 )"},
+        {"add /pho", "add /photos "},
+        {"show /photos/a", R"(show /photos/a\ b )"},
+        {R"(show /photos/a\ )", R"(show /photos/a\ b )"},
+        {"show '/photos/a ", "show '/photos/a b' "},
+        {"show /photos/i", R"(show /photos/it\'s\ \(new\)\ \&\ old )"},
+        {R"(show "/photos/it's)", R"(show "/photos/it's (new) & old" )"},
+    };
+    for (const Typed &row : rows) {
+        EXPECT_EQ(AfterTab(std::string("fileindexctl ") + row.line),
+                  std::string("fileindexctl ") + row.completed + "\n");
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(Shells, PromptTest,
+                         ::testing::Values(Shell{"Bash", "/bin/bash"}, Shell{"Zsh", "/bin/zsh"}),
+                         [](const auto &row) { return row.param.name; });
 
 } // namespace
 } // namespace VANO::TESTS

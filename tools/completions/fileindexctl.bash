@@ -41,6 +41,18 @@ _fileindexctl_folders() {
     _fileindexctl_add < <("${COMP_WORDS[0]}" list --null 2>/dev/null)
 }
 
+# The help names them in a sentence.
+_fileindexctl_checks() {
+    _fileindexctl_add < <("${COMP_WORDS[0]}" doctor --help 2>/dev/null | tr '\n' ' ' |
+        sed -n 's/.* checks are \([a-z, ]*\);.*/\1/p' | tr -s ', ' '\n' | grep -vx and | tr '\n' '\0')
+}
+
+# A name that is shown with escapes cannot be completed.
+_fileindexctl_marks() {
+    _fileindexctl_add < <("${COMP_WORDS[0]}" marks list 2>/dev/null |
+        sed -n '/\\/d; s/ *\(not \)\{0,1\}done$//p' | tr '\n' '\0')
+}
+
 _fileindexctl_files() { # -f for all files, -d for directories
     local file
     while IFS= read -r file; do
@@ -59,6 +71,8 @@ _fileindexctl_values() { # KIND COMMAND...
         _fileindexctl_files -f
         ;;
     PATH*,*) _fileindexctl_folders ;;
+    CHECK*) _fileindexctl_checks ;;
+    MARK,*) _fileindexctl_marks ;;
     *'|'*) _fileindexctl_add < <(tr '|' '\0' <<<"$1" | tr -d '\n' && printf '\0') ;;
     esac
 }
