@@ -35,6 +35,25 @@ bool ToTime(std::time_t &moment, std::tm time) {
     return moment != -1 && time.tm_mday == day;
 }
 
+// The first time after `now` when the clock shows the hour and minute of `today`. Where it is put
+// forth it may not show them on that day, where it is put back twice, in summer time and out of it:
+// both are tried, on three days.
+bool NextOnClock(std::time_t &moment, std::tm today, std::time_t now) {
+    today.tm_sec = 0;
+    moment = -1;
+    for (int attempt = 0; attempt < 6; ++attempt) {
+        std::tm time = today;
+        time.tm_mday += attempt / 2;
+        time.tm_isdst = attempt % 2;
+        const std::time_t next = std::mktime(&time);
+        const bool isShown = time.tm_hour == today.tm_hour && time.tm_min == today.tm_min;
+        if (isShown && next > now && (moment == -1 || next < moment)) {
+            moment = next;
+        }
+    }
+    return moment != -1;
+}
+
 } // namespace
 
 bool ReadDuration(long long &seconds, const std::string &text) {
@@ -61,20 +80,8 @@ bool ReadMoment(std::time_t &moment, const std::string &text, std::time_t now) {
             return ToTime(moment, time);
         }
     }
-    if (::localtime_r(&now, &time) == nullptr || !ReadWhole(time, text, "%H:%M") ||
-        !ToTime(moment, time)) {
-        return false;
-    }
-    if (moment > now) {
-        return true;
-    }
-    // That of tomorrow, which is 23 or 25 hours away where the clock is put back or forth.
-    std::tm next{};
-    const std::time_t noon = now + 24 * 3600LL;
-    (void)::localtime_r(&noon, &next);
-    next.tm_hour = time.tm_hour;
-    next.tm_min = time.tm_min;
-    return ToTime(moment, next);
+    return ::localtime_r(&now, &time) != nullptr && ReadWhole(time, text, "%H:%M") &&
+           NextOnClock(moment, time, now);
 }
 
 std::string TimeText(std::time_t time) {
