@@ -1,8 +1,10 @@
 #include <csignal>
 #include <exception>
+#include <fcntl.h>
 #include <iostream>
 #include <json/value.h>
 #include <memory>
+#include <unistd.h>
 
 #include "command.h"
 #include "help.h"
@@ -57,7 +59,11 @@ int Run(int argc, char **argv) {
     } catch (const CLI::ParseError &mistake) {
         return CTL::SayMistake(app, mistake);
     }
-    const CTL::ExitCode result = action();
+    return action();
+}
+
+// What was printed has not been written before.
+int Written(int result) {
     if (!std::cout.flush()) {
         CTL::Say("Cannot write the output.");
         return CTL::kFailed;
@@ -65,12 +71,23 @@ int Run(int argc, char **argv) {
     return result;
 }
 
+// A file that is opened would take the place of a standard stream that is closed, and what is
+// printed would go into it. Nothing can be written to this one.
+void FillStandardStreams() {
+    for (int fd = STDIN_FILENO; fd <= STDERR_FILENO; ++fd) {
+        if (::fcntl(fd, F_GETFD) == -1) {
+            (void)::open("/dev/null", O_RDONLY); // takes the lowest number that is free
+        }
+    }
+}
+
 } // namespace
 
 int main(int argc, char **argv) {
+    FillStandardStreams();
     (void)std::signal(SIGPIPE, SIG_IGN); // so that a reader who went away is a failed write
     try {
-        return Run(argc, argv);
+        return Written(Run(argc, argv));
     } catch (const Json::Exception &failure) {
         CTL::Say("A settings file holds a value of another kind than it should: " +
                  CTL::Shown(failure.what()));

@@ -115,12 +115,6 @@ INSTANTIATE_TEST_SUITE_P(
         Mistake{"SharePath", {"share", "pause", "/photos"}, "no name of a share"}),
     [](const auto &row) { return row.param.what; });
 
-TEST_F(CtlTest, AFullDeviceIsAFailure) {
-    Save(kPhotos);
-    Child child({FILEINDEXCTL_PATH, "list"}, "/dev/full", "/tmp/run.err");
-    EXPECT_EQ(child.Wait(), kFailed);
-}
-
 TEST_F(CtlTest, NothingNearIsNotSuggested) {
     EXPECT_THAT(Ctl({"frobnicate"}).error, Not(HasSubstr("Did you mean")));
     EXPECT_THAT(Ctl({"list", "--nonsense"}).error, Not(HasSubstr("Did you mean")));
