@@ -1,4 +1,4 @@
-#include <fileindex/error_handler.h>
+#include <algorithm>
 #include <fileindex/index_mgr.h>
 #include <fileindex/index_rules.h>
 #include <memory>
@@ -38,10 +38,8 @@ void PrintLines(const Json::Value &folder) {
     table.Print();
 }
 
-ExitCode SayNotSet(const std::string &path) {
+ExitCode SayNotSet(const std::string &path, const std::vector<fileindex::Folder> &folders) {
     Say(Shown(path) + " is not set.");
-    std::vector<fileindex::Folder> folders;
-    (void)fileindex::IndexMgr::List(folders); // without a list there is no hint
     const std::string governing =
         fileindex::GetMostSuitableCfg(Resolved(folders), ToFullPath(path))["path"].asString();
     Advise(governing.empty() ? "fileindexctl list shows the folders that are."
@@ -50,15 +48,19 @@ ExitCode SayNotSet(const std::string &path) {
 }
 
 ExitCode Run(const Options &options) {
+    // IndexMgr::Get() would take the lock, which is for those who may change something.
+    std::vector<fileindex::Folder> folders;
+    if (!fileindex::IndexMgr::List(folders)) {
+        return Fail("Cannot read the setting of " + Shown(options.path));
+    }
     std::string path = options.path;
     (void)ToSharePath(path, options.path); // it has been checked to be one
-    Json::Value setting;
-    if (!fileindex::IndexMgr::Get(setting, path)) {
-        return fileindex::ErrorHandler::GetError() == fileindex::FILEINDEX_ERR_NO_SUCH_FOLDER
-                   ? SayNotSet(path)
-                   : Fail("Cannot read the setting of " + Shown(path));
+    const auto setting = std::find_if(folders.begin(), folders.end(),
+                                      [&](const auto &folder) { return folder.path == path; });
+    if (setting == folders.end()) {
+        return SayNotSet(path, folders);
     }
-    Json::Value answer = WithFacts(setting);
+    Json::Value answer = WithFacts(setting->asJson());
     answer["full_path"] = ToFullPath(path);
     const auto refusal = RefusalOf(path);
     answer["refusal"] = AsJson(refusal);

@@ -18,6 +18,13 @@ Outcome Ctl(Words arguments) {
     return RunToEnd(arguments);
 }
 
+Outcome CtlAsNobody(const Words &arguments) {
+    Words command = {"/usr/bin/setpriv", "--reuid=65534", "--regid=65534", "--clear-groups",
+                     FILEINDEXCTL_PATH};
+    command.insert(command.end(), arguments.begin(), arguments.end());
+    return RunToEnd(command);
+}
+
 std::string CtlOnTerminal(const std::string &settings, const std::string &arguments) {
     const Outcome outcome =
         RunToEnd({"/usr/bin/script", "--quiet", "--return", "--command",

@@ -40,6 +40,10 @@ inline constexpr char kTwo[] =
 // Runs fileindexctl with these arguments.
 Outcome Ctl(Words arguments);
 
+// The same as a user without rights. Such a user may not be able to run it here: ask for --help
+// first.
+Outcome CtlAsNobody(const Words &arguments);
+
 // The same on a terminal; what that shows. `settings` are assignments of environment variables,
 // `arguments` words of a shell.
 std::string CtlOnTerminal(const std::string &settings, const std::string &arguments);

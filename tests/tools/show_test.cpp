@@ -78,5 +78,17 @@ TEST_F(CtlTest, AShareWinsOverAFullPath) {
     EXPECT_THAT(Ctl({"show", "/volume1/photos"}).out, HasSubstr("types      photo\n"));
 }
 
+TEST_F(CtlTest, ShowTakesNoLockAndNeedsNoRights) {
+    if (CtlAsNobody({"--help"}).status != kDone) {
+        GTEST_SKIP() << "no other user can run the program here";
+    }
+    Save(kPhotos);
+    RemoveTree(kFolderLock);
+    EXPECT_EQ(CtlAsNobody({"show", "/photos"}).status, kDone);
+    EXPECT_FALSE(Exists(kFolderLock));
+    const HoldLock other(kFolderLock);
+    EXPECT_EQ(CtlAsNobody({"show", "/photos"}).out, Ctl({"show", "/photos"}).out);
+}
+
 } // namespace
 } // namespace VANO::TESTS
