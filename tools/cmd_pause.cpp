@@ -64,11 +64,8 @@ ExitCode Run(const Options &options) {
     }
     const int hours = HoursOf(options);
     if (!While("Telling the daemon", [&] { return fileindex::StatusMgr::Pause(hours); })) {
-        if (!HasNoError()) {
-            return Fail("Cannot pause indexing");
-        }
-        return FailHalfWay("The pause is saved",
-                           "The daemon could not be told: is fileindexd running?");
+        return IsUnsaved() ? Fail("Cannot pause indexing")
+                           : FailHalfWay("The pause is saved", kDaemonAdvice);
     }
     long long resumeTime = 0;
     if (hours == 0 || !fileindex::StatusMgr::GetPauseInfo(resumeTime)) {

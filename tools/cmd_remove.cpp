@@ -67,10 +67,11 @@ ExitCode Preview(const std::vector<std::string> &paths, const std::vector<Folder
 ExitCode Remove(const std::vector<std::string> &paths) {
     if (!While("Telling the indexing service", [&] { return IndexMgr::Delete(ArrayOf(paths)); })) {
         std::vector<Folder> folders;
-        if (!IndexMgr::List(folders) || NotSet(paths, folders).size() < paths.size()) {
+        if (IsUnsaved() || !IndexMgr::List(folders) ||
+            NotSet(paths, folders).size() < paths.size()) {
             return Fail("Cannot remove " + Named(paths));
         }
-        return FailHalfWay("The setting is removed", "See the system log.");
+        return FailHalfWay("The setting is removed", "fileindexctl doctor tells what is wrong.");
     }
     Say("Removed " + Named(paths) + ".");
     return kDone;

@@ -21,11 +21,8 @@ ExitCode Run(bool isDryRun) {
         return kDone;
     }
     if (!While("Telling the daemon", [] { return fileindex::StatusMgr::Resume(); })) {
-        if (!HasNoError()) {
-            return Fail("Cannot end the pause");
-        }
-        return FailHalfWay("The end of the pause is saved",
-                           "The daemon could not be told: is fileindexd running?");
+        return IsUnsaved() ? Fail("Cannot end the pause")
+                           : FailHalfWay("The end of the pause is saved", kDaemonAdvice);
     }
     Say("Indexing goes on.");
     return kDone;

@@ -27,10 +27,11 @@ std::vector<std::string> PathsOf(const Json::Value &request) {
     return paths;
 }
 
-// Whether the settings hold what was asked for, whoever else did not hear of it.
+// Whether the settings hold what was asked for, whoever else did not hear of it. What they held
+// before may be that too, without having been saved.
 bool IsSaved(const Json::Value &request) {
     std::vector<Folder> folders;
-    if (!IndexMgr::List(folders)) {
+    if (IsUnsaved() || !IndexMgr::List(folders)) {
         return false;
     }
     return std::all_of(request.begin(), request.end(), [&](const Json::Value &wanted) {
@@ -104,8 +105,9 @@ ExitCode Save(const Json::Value &request, const Wording &wording) {
     const std::vector<std::string> paths = PathsOf(request);
     if (!While("Telling the indexing service", [&] { return IndexMgr::Upsert(request); })) {
         return IsSaved(request)
-                   ? FailHalfWay(Named(paths) + (paths.size() == 1 ? " is saved" : " are saved"),
-                                 "See the system log, then repeat this command.")
+                   ? FailHalfWay(
+                         Named(paths) + (paths.size() == 1 ? " is saved" : " are saved"),
+                         "fileindexctl doctor tells what is wrong; then repeat this command.")
                    : FailFor(request, wording);
     }
     Say(wording.done + (" " + Named(paths)) + ".");

@@ -91,7 +91,7 @@ int main(int argc, char **argv) {
     } catch (const Json::Exception &failure) {
         CTL::Say("A settings file holds a value of another kind than it should: " +
                  CTL::Shown(failure.what()));
-        CTL::Advise("Look at the files in /usr/vano/etc/fileindex.");
+        CTL::Advise("fileindexctl doctor settings shows where.");
     } catch (const std::exception &failure) {
         CTL::Say(CTL::Shown(failure.what()));
     }

@@ -1,14 +1,21 @@
 #include "messages.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
+#include <fcntl.h>
 #include <fileindex/error_handler.h>
+#include <fileindex/folders.h>
+#include <fileindex/status.h>
 #include <iostream>
 #include <string_view>
+#include <sys/stat.h>
+#include <system_error>
 #include <unistd.h>
 #include <vano_platform.h>
 
+#include "base/unique_fd.h"
 #include "output.h"
 #include "text.h"
 
@@ -21,9 +28,24 @@ namespace fileindex = VANO::FILEINDEX;
 constexpr std::size_t kMostNamed = 3;
 
 struct Explanation {
-    const char *why;
+    std::string why;
     const char *advice;
 };
+
+// Why nobody can have the lock, an errno: its file cannot be opened as the library opens it. 0 when
+// somebody holds it.
+int LockFileError() {
+    for (const std::string &path :
+         {fileindex::Folders().GetLockPath(), fileindex::Status().GetLockPath()}) {
+        struct stat info {};
+        if (::lstat(path.c_str(), &info) == 0 &&
+            !fileindex::UniqueFd(
+                ::open(path.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC, 0644))) {
+            return errno;
+        }
+    }
+    return 0;
+}
 
 Explanation ExplanationOf(fileindex::_tag_fileindex_err_ code) {
     switch (code) {
@@ -37,21 +59,31 @@ Explanation ExplanationOf(fileindex::_tag_fileindex_err_ code) {
         return {"1000 folders are set, which is the most", "Remove one first."};
     case fileindex::FILEINDEX_ERR_LOAD:
         return {"a settings file cannot be read or is no JSON",
-                "Look at the files in /usr/vano/etc/fileindex."};
+                "fileindexctl doctor settings shows where."};
     case fileindex::FILEINDEX_ERR_SAVE:
         return {"a settings file cannot be written",
-                "Check room and permissions of /usr/vano/etc/fileindex."};
+                "Check room and permissions of /usr/vano/etc/fileindex, or ask fileindexctl "
+                "doctor settings."};
     case fileindex::FILEINDEX_ERR_MALFORMED:
         return {"a settings file does not hold what it should",
-                "Look at the files in /usr/vano/etc/fileindex."};
+                "fileindexctl doctor settings shows where."};
     case fileindex::FILEINDEX_ERR_LOCK:
-        return {"the settings are locked", "Another program may be changing them: try again."};
+        if (const int error = LockFileError()) {
+            return {"a lock file cannot be opened: " + std::generic_category().message(error),
+                    "fileindexctl doctor locks looks at it."};
+        }
+        return {"the settings are locked", "Another program may be changing them: try again. "
+                                           "fileindexctl doctor locks tells which."};
     case fileindex::FILEINDEX_ERR_NONE:
     case fileindex::FILEINDEX_ERR_RESERVED:
         break;
     }
     return {"a part of the indexing service does not answer or cannot be changed",
-            "The system log says which."};
+            "fileindexctl doctor and the system log tell which."};
+}
+
+bool IsUnreadable(const std::string &path) {
+    return ::access(path.c_str(), R_OK) != 0 && errno == EACCES;
 }
 
 std::string PlatformError() {
@@ -67,10 +99,20 @@ std::string PlatformError() {
     return text;
 }
 
-bool MayNeedRoot(fileindex::_tag_fileindex_err_ code) {
-    return ::geteuid() != 0 &&
-           (code == fileindex::FILEINDEX_ERR_LOAD || code == fileindex::FILEINDEX_ERR_SAVE ||
-            code == fileindex::FILEINDEX_ERR_LOCK);
+// Whether it failed for want of rights.
+bool NeedsRoot(fileindex::_tag_fileindex_err_ code) {
+    if (::geteuid() == 0) {
+        return false;
+    }
+    switch (code) {
+    case fileindex::FILEINDEX_ERR_LOAD:
+        return IsUnreadable(fileindex::Folders().GetPath()) ||
+               IsUnreadable(fileindex::Status().GetPath());
+    case fileindex::FILEINDEX_ERR_LOCK:
+        return LockFileError() != 0;
+    default:
+        return code == fileindex::FILEINDEX_ERR_SAVE;
+    }
 }
 
 // A person gets lines that fit, a program one line.
@@ -98,7 +140,7 @@ ExitCode Fail(const std::string &what) {
     const auto code = fileindex::ErrorHandler::GetError();
     const Explanation explanation = ExplanationOf(code);
     Say(what + ": " + explanation.why + PlatformError() + ".");
-    Advise(MayNeedRoot(code) ? "This needs root: try again with sudo." : explanation.advice);
+    Advise(NeedsRoot(code) ? "This needs root: try again with sudo." : explanation.advice);
     return kFailed;
 }
 
@@ -108,8 +150,14 @@ ExitCode FailHalfWay(const std::string &what, const std::string &advice) {
     return kFailed;
 }
 
-bool HasNoError() {
-    return fileindex::ErrorHandler::GetError() == fileindex::FILEINDEX_ERR_NONE;
+bool IsUnsaved() {
+    const auto code = fileindex::ErrorHandler::GetError();
+    return code != fileindex::FILEINDEX_ERR_NONE && code != fileindex::FILEINDEX_ERR_PATH;
+}
+
+void ForgetErrors() {
+    fileindex::ErrorHandler::SetError(fileindex::FILEINDEX_ERR_NONE);
+    VLIBCErrSetEx(0, "", 0);
 }
 
 Working::Working(const std::string &what) : isShown_(::isatty(STDERR_FILENO) == 1 && CanErase()) {

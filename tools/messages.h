@@ -20,12 +20,20 @@ void Advise(const std::string &advice);
 // of the platform, and what to do about it.
 ExitCode Fail(const std::string &what);
 
+// Where the daemon did not hear of a change that was saved.
+constexpr char kDaemonAdvice[] =
+    "The daemon could not be told: is fileindexd running? fileindexctl doctor daemon tells more.";
+
 // Where the settings did change and only the service did not follow: says so.
 ExitCode FailHalfWay(const std::string &what, const std::string &advice);
 
-// Whether the library has named no error: then the settings are as asked for, and somebody else
-// did not follow.
-[[nodiscard]] bool HasNoError();
+// Whether what the library has failed at came before it saved the settings. What fails later it
+// does not name, except for a path that cannot be resolved, and that may be another folder's.
+[[nodiscard]] bool IsUnsaved();
+
+// Forgets the last errors of the library and of the platform: a question that was answered with no
+// is no error that a later message should name.
+void ForgetErrors();
 
 // While this lives, a person at a terminal sees what is being waited for.
 class Working {

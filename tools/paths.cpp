@@ -2,21 +2,16 @@
 
 #include <array>
 #include <climits>
-#include <fileindex/error_handler.h>
 #include <fileindex/share_path.h>
 #include <vano_platform.h>
+
+#include "messages.h"
 
 namespace CTL {
 
 namespace {
 
 namespace fileindex = VANO::FILEINDEX;
-
-// A question that was answered with no is no error that a later message should name.
-void ClearErrors() {
-    fileindex::ErrorHandler::SetError(fileindex::FILEINDEX_ERR_NONE);
-    VLIBCErrSetEx(0, "", 0);
-}
 
 // The name of the share that a full path lies in; empty when it lies in none. Asks the platform,
 // since the library would write every no into the system log.
@@ -92,7 +87,7 @@ std::vector<std::string> ToSharePaths(const std::vector<std::string> &asked) {
 std::string ToFullPath(const std::string &sharePath) {
     std::string fullPath;
     (void)fileindex::GetFullPath(fullPath, sharePath); // empty on failure
-    ClearErrors();
+    ForgetErrors();
     return fullPath;
 }
 

@@ -81,6 +81,32 @@ TEST_F(CtlTest, AddSaysThatTheSettingsAreLocked) {
     EXPECT_FALSE(Exists(kFolders));
 }
 
+TEST_F(CtlTest, AddOfWhatIsSetAlreadySaysThatTheSettingsAreLocked) {
+    Save(kPhotos);
+    const HoldLock other(kFolderLock);
+    for (const Words &arguments :
+         {Words{"add", "/photos", "--photo"}, Words{"set", "/photos", "--photo=yes"}}) {
+        const Outcome outcome = Ctl(arguments);
+        EXPECT_EQ(outcome.status, kFailed);
+        EXPECT_THAT(outcome.error, HasSubstr("/photos: the settings are locked"));
+    }
+}
+
+TEST_F(CtlTest, AddOfAFolderThatIsSetAndWhoseShareIsGoneFails) {
+    StartDaemon();
+    Save(R"({"/gone":{"photo":true}})");
+    const Outcome outcome = Ctl({"add", "/gone", "--photo"});
+    EXPECT_EQ(outcome.status, kFailed);
+    EXPECT_THAT(outcome.error, HasSubstr("Cannot add /gone: no share has that name"));
+}
+
+TEST_F(CtlTest, AddOfAFolderBesideOneThatIsGoneSaysThatItIsSaved) {
+    Save(R"({"/gone":{"photo":true}})");
+    const Outcome outcome = Ctl({"add", "/photos", "--photo"}); // nobody listens
+    EXPECT_EQ(outcome.status, kFailed);
+    EXPECT_THAT(outcome.error, HasSubstr("/photos is saved, but not every part"));
+}
+
 TEST_F(CtlTest, AddTakesAFullPathForAFolderOfAShare) {
     StartDaemon();
     const Outcome outcome = Ctl({"add", "/volume1/photos/2016", "--photo"});

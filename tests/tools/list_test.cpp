@@ -87,7 +87,7 @@ TEST_F(CtlTest, ListOfBrokenSettingsFails) {
         EXPECT_EQ(outcome.out, "") << broken;
         EXPECT_THAT(outcome.error, AllOf(StartsWith("fileindexctl: Cannot list the folders: a "
                                                     "settings file "),
-                                         HasSubstr("/usr/vano/etc/fileindex")))
+                                         HasSubstr("fileindexctl doctor settings")))
             << broken;
     }
 }

@@ -87,11 +87,9 @@ ExitCode Change(const Options &options, const Mark &mark) {
         Say("S" + sentence + (options.revive ? ", and is worked on again." : "."));
         return kDone;
     }
-    if (options.revive && !mark.has(options.share) && HasNoError()) {
-        return FailHalfWay("The mark is cleared",
-                           "The daemon could not be told: is fileindexd running?");
-    }
-    return Fail("Cannot change the mark of share " + Shown(options.share));
+    return options.revive && !IsUnsaved()
+               ? FailHalfWay("The mark is cleared", kDaemonAdvice)
+               : Fail("Cannot change the mark of share " + Shown(options.share));
 }
 
 ExitCode Run(const Options &options, const Mark &mark) {
