@@ -6,11 +6,11 @@
 #include <cstdlib>
 #include <fileindex/index_rules.h>
 #include <fileindex/share_path.h>
-#include <memory>
 #include <sys/stat.h>
 #include <system_error>
 #include <vano_platform.h>
 
+#include "share_record.h"
 #include "text.h"
 
 namespace CTL {
@@ -18,16 +18,6 @@ namespace CTL {
 namespace {
 
 constexpr int kUserSpaceFileSystem = 12;
-
-struct FreeRecord {
-    void operator()(_tag_VANOSHARE *record) const { VANOShareFree(record); }
-};
-using ShareRecord = std::unique_ptr<_tag_VANOSHARE, FreeRecord>;
-
-ShareRecord FindShare(const std::string &name) {
-    _tag_VANOSHARE *found = nullptr;
-    return ShareRecord(VANOShareGet(name.c_str(), &found) < 0 ? nullptr : found);
-}
 
 std::optional<Refusal> ByPlace(const std::string &fullPath) {
     if (fullPath.find("#recycle") != std::string::npos &&

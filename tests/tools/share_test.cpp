@@ -1,4 +1,5 @@
 #include <gmock/gmock.h>
+#include <sys/stat.h>
 
 #include "tools/ctl.h"
 
@@ -97,6 +98,16 @@ TEST_F(CtlTest, ShareListWithoutATableShowsSharesWithFolders) {
     RemoveTree(kShares);
     RemoveTree(kFolders);
     EXPECT_EQ(Ctl({"share", "list"}).error, "fileindexctl: No share is known.\n");
+}
+
+TEST_F(CtlTest, ShareListReadsTheTableAsThePlatformDoes) {
+    Save(kPhotos);
+    PutFile(kShares, R"({"media":"/volume2/media", /* a comment */ "x":"/volume1/x"})");
+    EXPECT_EQ(Ctl({"share", "list"}).out, "photos  -  1  no such share\n");
+    RemoveTree(kShares);
+    ASSERT_EQ(::mkfifo(kShares, 0644), 0); // which nobody writes to
+    EXPECT_EQ(Ctl({"share", "list"}).out, "photos  -  1  no such share\n");
+    RemoveTree(kShares);
 }
 
 TEST_F(CtlTest, ShareListOfBrokenFilesFails) {

@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "doctor/json_file.h"
+#include "shares.h"
 
 namespace CTL::DOCTOR {
 
@@ -14,17 +15,12 @@ constexpr char kFolderConf[] = "/usr/vano/etc/fileindex/folder.conf";
 constexpr char kStatusConf[] = "/usr/vano/etc/fileindex/status.conf";
 constexpr char kFolderLock[] = "/tmp/fileidx_cfg_folder.lock";
 constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
-constexpr char kShareTable[] = "/usr/vano/etc/shares.json";
 constexpr char kMonitorDirectory[] = "/usr/vano/etc/vanotifyd";
 constexpr char kDaemonSocket[] = "/var/run/fileindexd.sock";
 constexpr char kTakenQueueSuffix[] = ".tmp";
 
 // A share of the table, or one that a folder names.
-struct KnownShare {
-    std::string name;
-    std::string directory; // empty when the platform knows no such share
-    std::vector<VANO::FILEINDEX::Folder> folders;
-
+struct KnownShare : Share {
     // Asking the library for it would make the directory above it.
     [[nodiscard]] std::string Queue() const;
 

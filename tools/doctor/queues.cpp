@@ -7,6 +7,7 @@
 #include "doctor/file_kind.h"
 #include "doctor/queue_look.h"
 #include "text.h"
+#include "time_text.h"
 
 namespace CTL::DOCTOR {
 
@@ -22,8 +23,7 @@ constexpr long long kLongestWork = 24LL * 3600;
 bool MayWait(const Machine &machine) {
     const Json::Value &status = machine.statusFile.value;
     const Json::Value pause = status.isObject() ? status.get("resume_time", -1) : -1;
-    return pause.isInt64() && pause.asInt64() != -1 &&
-           (pause.asInt64() == 0 || pause.asInt64() > std::time(nullptr));
+    return pause.isInt64() && IsPaused(pause.asInt64(), std::time(nullptr));
 }
 
 std::string EventsOf(const QueueLook &look) {

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <fileindex/index_rules.h>
+#include <fileindex/status_mgr.h>
 #include <optional>
 #include <sys/statvfs.h>
 
@@ -12,6 +13,8 @@
 namespace CTL::DOCTOR {
 
 namespace {
+
+using VANO::FILEINDEX::StatusMgr;
 
 // Nearly full: less than a twentieth free, but never more than 10 GiB nor less than 100 MiB.
 constexpr unsigned long long kLeastFree = 100ULL * 1024 * 1024;
@@ -33,11 +36,6 @@ std::optional<Room> RoomOf(const std::string &directory) {
     }
     const unsigned long long block = volume.f_frsize != 0 ? volume.f_frsize : volume.f_bsize;
     return Room{volume.f_blocks * block, volume.f_bavail * block};
-}
-
-bool IsMarked(const Machine &machine, const char *kind, const std::string &share) {
-    const Json::Value &status = machine.statusFile.value;
-    return status.isObject() && status[kind].isObject() && status[kind].isMember(share);
 }
 
 void LookAtRoom(Findings &findings, const KnownShare &share) {
@@ -64,8 +62,8 @@ void LookAtRoom(Findings &findings, const KnownShare &share) {
     }
 }
 
-void LookAtMarks(Findings &findings, const Machine &machine, const KnownShare &share) {
-    if (IsMarked(machine, "no_space", share.name)) {
+void LookAtMarks(Findings &findings, const KnownShare &share) {
+    if (StatusMgr::ShareIsNoSpace(share.name)) {
         const bool isEnough =
             !share.directory.empty() && VANO::FILEINDEX::IsShareSpaceEnough(share.name);
         findings.push_back(Error("mark-no-space", share.name,
@@ -75,7 +73,7 @@ void LookAtMarks(Findings &findings, const Machine &machine, const KnownShare &s
                                .Mend(isEnough ? "Let it go on." : "Make room, then let it go on.",
                                      share.ReindexCommand()));
     }
-    if (IsMarked(machine, "need_reindex", share.name)) {
+    if (StatusMgr::ShareIsNeedReindex(share.name)) {
         findings.push_back(
             Warning("mark-need-reindex", share.name,
                     "The share " + Shown(share.name) + " is marked as needing a new index")
@@ -98,7 +96,7 @@ Findings CheckRoom(const Machine &machine) {
         if (!share.directory.empty()) {
             LookAtRoom(findings, share);
         }
-        LookAtMarks(findings, machine, share);
+        LookAtMarks(findings, share);
     }
     if (findings.empty()) {
         findings.push_back(Ok("room-good", "",

@@ -4,7 +4,7 @@
 #include "messages.h"
 #include "output.h"
 #include "share/commands.h"
-#include "share/shares.h"
+#include "shares.h"
 
 namespace CTL {
 
@@ -18,7 +18,7 @@ folders, and state.
 Examples:
   fileindexctl share list
   fileindexctl share list --json=pretty
-  fileindexctl share list --null | xargs -0 -n 1 fileindexctl share resume)";
+  fileindexctl share list --null | xargs -0 fileindexctl query --share)";
 
 struct Options {
     bool isNull = false;

@@ -7,7 +7,7 @@
 #include "messages.h"
 #include "output.h"
 #include "share/commands.h"
-#include "share/shares.h"
+#include "shares.h"
 #include "text.h"
 
 namespace CTL {

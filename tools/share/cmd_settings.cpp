@@ -8,7 +8,7 @@
 #include "messages.h"
 #include "paths.h"
 #include "share/commands.h"
-#include "share/shares.h"
+#include "shares.h"
 #include "text.h"
 
 namespace CTL {

@@ -1,0 +1,87 @@
+#include "shares.h"
+
+#include <fileindex/index_mgr.h>
+#include <fileindex/share_path.h>
+#include <fileindex/status_mgr.h>
+#include <map>
+
+#include "base/json_io.h"
+#include "share_record.h"
+#include "status_file.h"
+
+namespace CTL {
+
+namespace {
+
+using VANO::FILEINDEX::Folder;
+using VANO::FILEINDEX::IndexMgr;
+using VANO::FILEINDEX::StatusMgr;
+
+ShareFacts WithMarks(Share share) {
+    ShareFacts facts{std::move(share)};
+    facts.isOutOfSpace = StatusMgr::ShareIsNoSpace(facts.name);
+    facts.needsReindex = StatusMgr::ShareIsNeedReindex(facts.name);
+    return facts;
+}
+
+} // namespace
+
+std::set<std::string> NamesIn(const Json::Value &object) {
+    const auto names = object.isObject() ? object.getMemberNames() : Json::Value::Members();
+    return {names.begin(), names.end()};
+}
+
+std::vector<Share> SharesOf(const std::set<std::string> &names,
+                            const std::vector<Folder> &folders) {
+    std::map<std::string, Share> shares;
+    for (const std::string &name : names) {
+        shares[name].name = name;
+    }
+    for (const Folder &folder : folders) {
+        std::string name;
+        if (VANO::FILEINDEX::GetShareNameByPath(name, folder.path)) {
+            shares[name].name = name;
+            shares[name].folders.push_back(folder);
+        }
+    }
+    std::vector<Share> list;
+    for (auto &[name, share] : shares) {
+        share.directory = DirectoryOfShare(name);
+        list.push_back(std::move(share));
+    }
+    return list;
+}
+
+bool ListShares(std::vector<ShareFacts> &shares) {
+    std::vector<Folder> folders;
+    Json::Value status;
+    if (!IndexMgr::List(folders) || !LoadStatus(status)) {
+        return false;
+    }
+    // A table that is not there or is broken names no share; the platform then knows none either.
+    Json::Value table;
+    (void)VANO::FILEINDEX::JsonFromFile(table, kShareTable);
+    std::set<std::string> names = NamesIn(table);
+    names.merge(NamesIn(status["no_space"]));
+    names.merge(NamesIn(status["need_reindex"]));
+    for (Share &share : SharesOf(names, folders)) {
+        shares.push_back(WithMarks(std::move(share)));
+    }
+    return true;
+}
+
+bool LookUpShare(ShareFacts &share, const std::string &name) {
+    std::vector<Folder> folders;
+    Json::Value status;
+    if (!IndexMgr::List(folders) || !LoadStatus(status)) {
+        return false;
+    }
+    for (Share &known : SharesOf({name}, folders)) {
+        if (known.name == name) {
+            share = WithMarks(std::move(known));
+        }
+    }
+    return true;
+}
+
+} // namespace CTL

@@ -1,0 +1,43 @@
+#ifndef FILEINDEXCTL_SHARES_H
+#define FILEINDEXCTL_SHARES_H
+
+#include <fileindex/folder.h>
+#include <json/value.h>
+#include <set>
+#include <string>
+#include <vector>
+
+namespace CTL {
+
+// Where plain Linux has its shares. The platform finds shares by name and lists none.
+constexpr char kShareTable[] = "/usr/vano/etc/shares.json";
+
+struct Share {
+    std::string name;
+    std::string directory; // empty when no share has that name
+    std::vector<VANO::FILEINDEX::Folder> folders;
+};
+
+// The members of an object, such as the share table, whose names are shares'; none of another
+// value.
+[[nodiscard]] std::set<std::string> NamesIn(const Json::Value &object);
+
+// The shares of these names and those that the folders lie in, in byte order.
+[[nodiscard]] std::vector<Share> SharesOf(const std::set<std::string> &names,
+                                          const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+struct ShareFacts : Share {
+    bool isOutOfSpace = false;
+    bool needsReindex = false;
+};
+
+// Every share that has folder settings or marks, and those of the share table where the system has
+// one. False when the settings cannot be read.
+[[nodiscard]] bool ListShares(std::vector<ShareFacts> &shares);
+
+// Of a single share, whether there is one of that name or not.
+[[nodiscard]] bool LookUpShare(ShareFacts &share, const std::string &name);
+
+} // namespace CTL
+
+#endif
