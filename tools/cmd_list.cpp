@@ -9,6 +9,7 @@
 #include "folder_view.h"
 #include "messages.h"
 #include "output.h"
+#include "shares.h"
 #include "text.h"
 
 namespace CTL {
@@ -38,12 +39,9 @@ struct Options {
 };
 
 std::string CheckField(const std::string &field) {
-    for (const char *known : {"path", "name", "document", "audio", "video", "photo"}) {
-        if (field == known) {
-            return {};
-        }
-    }
-    return "it is path, name, document, audio, video or photo, not '" + field + "'";
+    const bool isKnown = field == "path" || field == "name" ||
+                         std::find(kFileTypes.begin(), kFileTypes.end(), field) != kFileTypes.end();
+    return isKnown ? "" : "it is path, name, document, audio, video or photo, not '" + field + "'";
 }
 
 bool LiesIn(const std::string &share, const Json::Value &folder) {
@@ -55,13 +53,14 @@ bool LiesIn(const std::string &share, const Json::Value &folder) {
 // All that match, in order. The library's own pages know no share, and its descending ones do not
 // move with the offset.
 bool Matching(std::vector<Json::Value> &folders, const Options &options) {
+    const std::string share = options.share.empty() ? "" : NameOfShare(options.share);
     Json::Value page;
     if (!VANO::FILEINDEX::IndexMgr::List(page, 0, kAll, options.sort, "ASC",
                                          Json::Value(Json::arrayValue))) {
         return false;
     }
     std::copy_if(page["folder"].begin(), page["folder"].end(), std::back_inserter(folders),
-                 [&](const Json::Value &folder) { return LiesIn(options.share, folder); });
+                 [&](const Json::Value &folder) { return LiesIn(share, folder); });
     if (options.isDescending) {
         std::reverse(folders.begin(), folders.end());
     }

@@ -9,6 +9,7 @@
 #include "output.h"
 #include "paths.h"
 #include "query_reason.h"
+#include "shares.h"
 #include "text.h"
 
 namespace CTL {
@@ -51,8 +52,9 @@ const char *Word(const Answer &answer) {
 Answer AnswerTo(const std::string &asked, const Options &options,
                 const std::vector<Folder> &folders) {
     if (options.isShare) {
-        return {IndexMgr::IsShareIndexed(asked),
-                options.isWhy ? ReasonOfShare(asked, folders) : Reason()};
+        const std::string share = NameOfShare(asked);
+        return {IndexMgr::IsShareIndexed(share),
+                options.isWhy ? ReasonOfShare(share, folders) : Reason()};
     }
     Location location;
     if (options.isFullPath) {

@@ -9,6 +9,7 @@
 #include "folder_view.h"
 #include "messages.h"
 #include "paths.h"
+#include "share_record.h"
 #include "text.h"
 
 namespace CTL {
@@ -31,13 +32,16 @@ struct Options {
     bool isDryRun = false;
 };
 
+std::string ShareOf(const std::string &path) {
+    std::string share;
+    (void)VANO::FILEINDEX::GetShareNameByPath(share, path); // no path is empty
+    return share;
+}
+
 std::set<std::string> SharesOf(const std::vector<std::string> &paths) {
     std::set<std::string> shares;
     for (const std::string &path : paths) {
-        std::string share;
-        if (VANO::FILEINDEX::GetShareNameByPath(share, path)) {
-            shares.insert(share);
-        }
+        shares.insert(ShareOf(path));
     }
     return shares;
 }
@@ -77,11 +81,34 @@ ExitCode Remove(const std::vector<std::string> &paths) {
     return kDone;
 }
 
+// Whether a folder is set under another spelling of its share's name than the share's own.
+bool IsMisspelt(const std::string &asked, const std::vector<Folder> &folders) {
+    const std::string own = OwnNameOf(ShareOf(asked));
+    return !own.empty() && own != ShareOf(asked) && IsSet(asked, folders);
+}
+
+// The library would take the share for one without folders, and delete the index of the others.
+ExitCode SayMisspelt(const std::string &asked) {
+    const std::string share = ShareOf(asked);
+    const std::string own = OwnNameOf(share);
+    Say("Nothing is removed: " + Shown(asked) + " is set under another spelling of share " +
+        Shown(own) + ", which would lose its index.");
+    Advise("fileindexctl share rename " + Shown(share) + " " + Shown(own) +
+           " sets it right; remove it then.");
+    return kFailed;
+}
+
 ExitCode Run(const Options &options) {
     const std::vector<std::string> paths = ToSharePaths(options.paths);
     std::vector<Folder> folders;
     if (!IndexMgr::List(folders)) {
         return Fail("Cannot remove " + Named(paths));
+    }
+    const auto misspelt =
+        std::find_if(options.paths.begin(), options.paths.end(),
+                     [&](const std::string &asked) { return IsMisspelt(asked, folders); });
+    if (misspelt != options.paths.end()) {
+        return SayMisspelt(*misspelt);
     }
     // The library takes a folder that is not set for removed.
     const std::vector<std::string> missing = NotSet(paths, folders);

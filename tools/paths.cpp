@@ -6,6 +6,7 @@
 #include <vano_platform.h>
 
 #include "messages.h"
+#include "share_record.h"
 
 namespace CTL {
 
@@ -58,16 +59,17 @@ bool ToSharePath(std::string &sharePath, const std::string &asked) {
     if (asked.empty() || asked[0] != '/') {
         return false;
     }
-    std::string converted;
-    if (ToFullPath(asked).empty()) {
-        converted = SharePathOfFullPath(asked);
-    }
-    sharePath = converted.empty() ? asked : converted;
+    std::string share;
+    (void)fileindex::GetShareNameByPath(share, asked); // the path is not empty
+    const std::string own = OwnNameOf(share);
+    const std::string found =
+        own.empty() ? SharePathOfFullPath(asked) : fileindex::ReplaceShareName(asked, own);
+    sharePath = found.empty() ? asked : found;
     return true;
 }
 
 std::string SharePathOfFullPath(const std::string &fullPath) {
-    const std::string share = "/" + ShareOfFullPath(fullPath);
+    const std::string share = "/" + OwnNameOf(ShareOfFullPath(fullPath));
     const std::string directory = ToFullPath(share);
     if (directory.empty() || !fileindex::StringStartWith(fullPath + "/", directory + "/")) {
         return {};

@@ -18,7 +18,8 @@ CLI::Option *AddPathsTo(CLI::App &app, std::vector<std::string> &paths, const ch
 [[nodiscard]] std::string CheckFolderPath(const std::string &path);
 
 // The share path that a user means, who may have typed a full path. `asked` is, in this order:
-//   - a share path, when its first component is the name of a share;
+//   - a share path, when its first component is the name of a share, which is then spelt as the
+//     share's own name is;
 //   - a full path, when it lies in a share;
 //   - else a share path as typed, so that settings of shares that are gone can be named.
 // The last errors of the library and of the platform are cleared.

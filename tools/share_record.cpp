@@ -24,4 +24,10 @@ std::string DirectoryOfShare(const std::string &name) {
     return share ? share->path : "";
 }
 
+std::string OwnNameOf(const std::string &name) {
+    // Not the record's name, which may differ in case from the directory's.
+    const std::string directory = DirectoryOfShare(name);
+    return directory.substr(directory.rfind('/') + 1);
+}
+
 } // namespace CTL

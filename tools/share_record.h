@@ -20,6 +20,11 @@ using ShareRecord = std::unique_ptr<_tag_VANOSHARE, FreeShareRecord>;
 // Where a share lies; empty when no share has that name. The last errors are cleared.
 [[nodiscard]] std::string DirectoryOfShare(const std::string &name);
 
+// The one spelling of a share's name with which its paths lead to its directory: the platform takes
+// any case, everybody else compares byte for byte. Empty when no share has that name. The last
+// errors are cleared.
+[[nodiscard]] std::string OwnNameOf(const std::string &name);
+
 } // namespace CTL
 
 #endif

@@ -70,12 +70,22 @@ bool ListShares(std::vector<ShareFacts> &shares) {
     return true;
 }
 
-bool LookUpShare(ShareFacts &share, const std::string &name) {
+std::string NameOfShare(const std::string &typed) {
+    if (IndexMgr::IsShareIndexed(typed) || StatusMgr::ShareIsNoSpace(typed) ||
+        StatusMgr::ShareIsNeedReindex(typed)) {
+        return typed;
+    }
+    const std::string own = OwnNameOf(typed);
+    return own.empty() ? typed : own;
+}
+
+bool LookUpShare(ShareFacts &share, const std::string &typed) {
     std::vector<Folder> folders;
     Json::Value status;
     if (!IndexMgr::List(folders) || !LoadStatus(status)) {
         return false;
     }
+    const std::string name = NameOfShare(typed);
     for (Share &known : SharesOf({name}, folders)) {
         if (known.name == name) {
             share = WithMarks(std::move(known));

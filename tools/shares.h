@@ -35,8 +35,12 @@ struct ShareFacts : Share {
 // one. False when the settings cannot be read.
 [[nodiscard]] bool ListShares(std::vector<ShareFacts> &shares);
 
-// Of a single share, whether there is one of that name or not.
-[[nodiscard]] bool LookUpShare(ShareFacts &share, const std::string &name);
+// The name under which a share is kept that a user names: as typed where the settings or the marks
+// have it so, or where there is no such share; else its own name.
+[[nodiscard]] std::string NameOfShare(const std::string &typed);
+
+// Of a single share by NameOfShare(), whether there is one of that name or not.
+[[nodiscard]] bool LookUpShare(ShareFacts &share, const std::string &typed);
 
 } // namespace CTL
 

@@ -166,7 +166,7 @@ TEST_F(CtlTest, ShareRenameDryRunTellsAndDoesNothing) {
               "Would move /gone/x to /media/x.\n");
     const Outcome unknown = Ctl({"share", "rename", "photos", "nix", "--dry-run"});
     EXPECT_EQ(unknown.status, kFailed);
-    EXPECT_THAT(unknown.error, HasSubstr("no share has the name nix"));
+    EXPECT_THAT(unknown.error, HasSubstr("photos to nix: no share has that name"));
     EXPECT_EQ(ReadText(kFolders), kWithGone);
 }
 

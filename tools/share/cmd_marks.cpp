@@ -58,38 +58,34 @@ struct Options {
     [[nodiscard]] bool IsChange() const { return set || clear || revive; }
 };
 
-ExitCode Tell(const Options &options, const Mark &mark) {
-    const bool hasMark = mark.has(options.share);
+ExitCode Tell(const Options &options, const Mark &mark, const std::string &share) {
+    const bool hasMark = mark.has(share);
     if (options.json != JsonMode::kOff) {
         Json::Value answer(Json::objectValue);
-        answer["name"] = options.share;
+        answer["name"] = share;
         answer[mark.key] = hasMark;
         PrintJson(answer, options.json);
     } else {
-        std::cout << "Share " << Shown(options.share) << ' ' << (hasMark ? mark.yes : mark.no)
-                  << ".\n";
+        std::cout << "Share " << Shown(share) << ' ' << (hasMark ? mark.yes : mark.no) << ".\n";
     }
     return hasMark ? kDone : kNotFound;
 }
 
-ExitCode Change(const Options &options, const Mark &mark) {
-    const std::string sentence =
-        "hare " + Shown(options.share) + " " + (options.set ? mark.yes : mark.no);
+ExitCode Change(const Options &options, const Mark &mark, const std::string &share) {
+    const std::string sentence = "hare " + Shown(share) + " " + (options.set ? mark.yes : mark.no);
     if (options.isDryRun) {
         std::cout << "Would see to it that s" << sentence << ".\n";
         return kDone;
     }
     const bool isDone = While("Telling the indexing service", [&] {
-        return options.revive ? StatusMgr::ShareRevive(options.share)
-                              : mark.change(options.share, options.set);
+        return options.revive ? StatusMgr::ShareRevive(share) : mark.change(share, options.set);
     });
     if (isDone) {
         Say("S" + sentence + (options.revive ? ", and is worked on again." : "."));
         return kDone;
     }
-    return options.revive && !IsUnsaved()
-               ? FailHalfWay("The mark is cleared", kDaemonAdvice)
-               : Fail("Cannot change the mark of share " + Shown(options.share));
+    return options.revive && !IsUnsaved() ? FailHalfWay("The mark is cleared", kDaemonAdvice)
+                                          : Fail("Cannot change the mark of share " + Shown(share));
 }
 
 ExitCode Run(const Options &options, const Mark &mark) {
@@ -98,13 +94,10 @@ ExitCode Run(const Options &options, const Mark &mark) {
         return Fail("Cannot look up share " + Shown(options.share));
     }
     // Marks of shares that are gone can be cleared.
-    const bool isKnown = !share.directory.empty() || mark.has(options.share);
-    if (!isKnown) {
-        Say("No share has the name " + Shown(options.share) + ".");
-        Advise("fileindexctl share list shows the shares.");
-        return kNotFound;
+    if (share.directory.empty() && !mark.has(share.name)) {
+        return SayNoShare(share.name);
     }
-    return options.IsChange() ? Change(options, mark) : Tell(options, mark);
+    return options.IsChange() ? Change(options, mark, share.name) : Tell(options, mark, share.name);
 }
 
 std::shared_ptr<Options> AddMarkOptionsTo(CLI::App &app) {

@@ -6,8 +6,8 @@
 #include <memory>
 
 #include "messages.h"
-#include "paths.h"
 #include "share/commands.h"
+#include "share_record.h"
 #include "shares.h"
 #include "text.h"
 
@@ -53,12 +53,12 @@ std::string CountText(const std::vector<Folder> &folders) {
 
 ExitCode RunRemove(const ShareOptions &options) {
     ShareFacts share;
-    const std::string what = "the folders of share " + Shown(options.share);
+    const std::string failure = "Cannot remove the folders of share " + Shown(options.share);
     if (!LookUpShare(share, options.share)) {
-        return Fail("Cannot remove " + what);
+        return Fail(failure);
     }
     if (share.folders.empty()) {
-        return SayNoFolders(options.share);
+        return SayNoFolders(share.name);
     }
     if (options.isDryRun) {
         for (const Folder &folder : share.folders) {
@@ -66,45 +66,41 @@ ExitCode RunRemove(const ShareOptions &options) {
         }
         return kDone;
     }
-    if (!While("Removing", [&] { return IndexMgr::ShareRemove(options.share); })) {
-        return Fail("Cannot remove " + what);
+    if (!While("Removing", [&] { return IndexMgr::ShareRemove(share.name); })) {
+        return Fail(failure);
     }
-    Say("Removed " + CountText(share.folders) + " of share " + Shown(options.share) + ".");
+    Say("Removed " + CountText(share.folders) + " of share " + Shown(share.name) + ".");
     if (!share.directory.empty()) {
         Advise("Its index is still there: fileindexctl share clean deletes it.");
     }
     return kDone;
 }
 
-ExitCode PreviewRename(const RenameOptions &options, const std::vector<Folder> &folders) {
-    if (ToFullPath("/" + options.now).empty()) {
-        Say("Cannot move the folders: no share has the name " + Shown(options.now) + ".");
-        Advise("Rename the share first.");
-        return kFailed;
-    }
-    for (const Folder &folder : folders) {
-        std::cout << "Would move " << Shown(folder.path) << " to "
-                  << Shown(VANO::FILEINDEX::ReplaceShareName(folder.path, options.now)) << ".\n";
-    }
-    return kDone;
-}
-
 ExitCode RunRename(const RenameOptions &options) {
     ShareFacts share;
-    const std::string what = Shown(options.old) + " to " + Shown(options.now);
+    const std::string own = OwnNameOf(options.now);
+    const std::string now = own.empty() ? options.now : own;
+    const std::string what = Shown(options.old) + " to " + Shown(now);
     if (!LookUpShare(share, options.old)) {
         return Fail("Cannot move the folders of " + what);
     }
     if (share.folders.empty()) {
-        return SayNoFolders(options.old);
+        return SayNoFolders(share.name);
+    }
+    if (own.empty()) {
+        // To the library a new name that is no share's is a bad parameter; this names the reason.
+        std::string fullPath;
+        (void)VANO::FILEINDEX::GetFullPath(fullPath, "/" + now);
+        return Fail("Cannot move the folders of " + what);
     }
     if (options.isDryRun) {
-        return PreviewRename(options, share.folders);
+        for (const Folder &folder : share.folders) {
+            std::cout << "Would move " << Shown(folder.path) << " to "
+                      << Shown(VANO::FILEINDEX::ReplaceShareName(folder.path, now)) << ".\n";
+        }
+        return kDone;
     }
-    if (!IndexMgr::ShareRename(options.old, options.now)) {
-        // A new name that is no share's is a bad parameter to the library; this names the reason.
-        std::string fullPath;
-        (void)VANO::FILEINDEX::GetFullPath(fullPath, "/" + options.now);
+    if (!IndexMgr::ShareRename(share.name, now)) {
         return Fail("Cannot move the folders of " + what);
     }
     Say("Moved the folders of " + what + ".");

@@ -1,4 +1,6 @@
+#include "messages.h"
 #include "share/commands.h"
+#include "text.h"
 
 namespace CTL {
 
@@ -36,6 +38,12 @@ void AddShareTo(CLI::App &app, const char *label, std::string &share, const char
 void AddShareOptionsTo(CLI::App &app, ShareOptions &options) {
     AddShareTo(app, "SHARE", options.share, "Name of the share");
     AddDryRunOption(app, options.isDryRun);
+}
+
+ExitCode SayNoShare(const std::string &share) {
+    Say("No share has the name " + Shown(share) + ".");
+    Advise("fileindexctl share list shows the shares.");
+    return kNotFound;
 }
 
 Action DeclareShare(CLI::App &app) {

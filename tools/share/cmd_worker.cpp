@@ -5,8 +5,8 @@
 #include <memory>
 
 #include "messages.h"
-#include "paths.h"
 #include "share/commands.h"
+#include "share_record.h"
 #include "text.h"
 
 namespace CTL {
@@ -54,17 +54,16 @@ constexpr Operation kClean = {IndexMgr::CleanShareIndexData, "Would delete the i
                               "fileindexctl reindex makes a new one for its folders."};
 
 ExitCode Run(const ShareOptions &options, const Operation &operation) {
-    const std::string share = " " + Shown(options.share);
-    if (ToFullPath("/" + options.share).empty()) {
-        Say("No share has the name" + share + ".");
-        Advise("fileindexctl share list shows the shares.");
-        return kNotFound;
+    const std::string name = OwnNameOf(options.share);
+    if (name.empty()) {
+        return SayNoShare(options.share);
     }
+    const std::string share = " " + Shown(name);
     if (options.isDryRun) {
         std::cout << operation.would + share + ".\n";
         return kDone;
     }
-    if (!While("Telling the indexing service", [&] { return operation.run(options.share); })) {
+    if (!While("Telling the indexing service", [&] { return operation.run(name); })) {
         return Fail(operation.attempt + share);
     }
     Say(operation.done + share + ".");

@@ -28,6 +28,9 @@ struct ShareOptions {
 };
 void AddShareOptionsTo(CLI::App &app, ShareOptions &options);
 
+// Answers that there is no such share.
+ExitCode SayNoShare(const std::string &share);
+
 } // namespace CTL
 
 #endif
