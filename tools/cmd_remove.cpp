@@ -46,21 +46,37 @@ std::set<std::string> SharesOf(const std::vector<std::string> &paths) {
     return shares;
 }
 
-ExitCode Preview(const std::vector<std::string> &paths, const std::vector<Folder> &folders) {
+std::vector<std::string> Left(const std::vector<Folder> &folders,
+                              const std::vector<std::string> &paths) {
     std::vector<std::string> left;
     for (const Folder &folder : folders) {
         if (std::find(paths.begin(), paths.end(), folder.path) == paths.end()) {
             left.push_back(folder.path);
         }
     }
+    return left;
+}
+
+// The shares that lose their index; one that is gone has none.
+std::vector<std::string> SharesToClean(const std::vector<std::string> &paths,
+                                       const std::vector<std::string> &left) {
+    const std::set<std::string> kept = SharesOf(left);
+    std::vector<std::string> shares;
+    for (const std::string &share : SharesOf(paths)) {
+        if (kept.count(share) == 0 && FindShare(share)) {
+            shares.push_back(share);
+        }
+    }
+    return shares;
+}
+
+ExitCode Preview(const std::vector<std::string> &paths, const std::vector<Folder> &folders) {
+    const std::vector<std::string> left = Left(folders, paths);
     for (const std::string &path : paths) {
         std::cout << "Would remove " << Shown(path) << ".\n";
     }
-    const std::set<std::string> sharesLeft = SharesOf(left);
-    for (const std::string &share : SharesOf(paths)) {
-        if (sharesLeft.count(share) == 0) {
-            std::cout << "Would delete the index of share " << Shown(share) << ".\n";
-        }
+    for (const std::string &share : SharesToClean(paths, left)) {
+        std::cout << "Would delete the index of share " << Shown(share) << ".\n";
     }
     if (left.empty()) {
         std::cout << "Would stop fileindexd and switch Spotlight off: no folder would be left.\n";
@@ -68,8 +84,30 @@ ExitCode Preview(const std::vector<std::string> &paths, const std::vector<Folder
     return kDone;
 }
 
+// Drops the settings of shares that are gone. The library does that too, and then fails for their
+// index, which nobody can delete.
+bool RemoveGone(const std::vector<std::string> &paths) {
+    if (paths.empty() || IndexMgr::Delete(ArrayOf(paths))) {
+        return true;
+    }
+    std::vector<Folder> folders;
+    if (IsUnsaved() || !IndexMgr::List(folders) || NotSet(paths, folders).size() < paths.size()) {
+        return false;
+    }
+    ForgetErrors();
+    return true;
+}
+
 ExitCode Remove(const std::vector<std::string> &paths) {
-    if (!While("Telling the indexing service", [&] { return IndexMgr::Delete(ArrayOf(paths)); })) {
+    std::vector<std::string> present;
+    std::vector<std::string> gone;
+    for (const std::string &path : paths) {
+        (FindShare(ShareOf(path)) ? present : gone).push_back(path);
+    }
+    const bool isDone = While("Telling the indexing service", [&] {
+        return RemoveGone(gone) && (present.empty() || IndexMgr::Delete(ArrayOf(present)));
+    });
+    if (!isDone) {
         std::vector<Folder> folders;
         if (IsUnsaved() || !IndexMgr::List(folders) ||
             NotSet(paths, folders).size() < paths.size()) {
@@ -78,6 +116,9 @@ ExitCode Remove(const std::vector<std::string> &paths) {
         return FailHalfWay("The setting is removed", "fileindexctl doctor tells what is wrong.");
     }
     Say("Removed " + Named(paths) + ".");
+    if (!gone.empty()) {
+        Advise("There was no index to delete of " + Named(gone) + ": no share has that name.");
+    }
     return kDone;
 }
 

@@ -75,5 +75,45 @@ TEST_F(CtlTest, RemoveDryRunKeepsTheIndexOfAShareWithOtherFolders) {
     EXPECT_EQ(Ctl({"remove", "/photos", "--dry-run"}).out, "Would remove /photos.\n");
 }
 
+constexpr char kWithGone[] = R"({"/gone/x":{"photo":true},"/media":{"photo":true},)"
+                             R"("/photos":{"photo":true}})";
+
+TEST_F(CtlTest, RemoveOfAFolderWhoseShareIsGoneIsDone) {
+    Save(kWithGone);
+    const Outcome preview = Ctl({"remove", "/gone/x", "--dry-run"});
+    EXPECT_EQ(preview.status, kDone);
+    EXPECT_EQ(preview.out, "Would remove /gone/x.\n");
+    const Outcome outcome = Ctl({"remove", "/gone/x"});
+    EXPECT_EQ(outcome.status, kDone);
+    EXPECT_EQ(outcome.error,
+              "fileindexctl: Removed /gone/x.\n"
+              "  There was no index to delete of /gone/x: no share has that name.\n");
+    EXPECT_THAT(ReadJson(kFolders).getMemberNames(), ElementsAre("/media", "/photos"));
+}
+
+TEST_F(CtlTest, RemoveGoesOnBeyondAShareThatIsGone) {
+    StartDaemon();
+    Save(kWithGone);
+    MakeDirs(kPhotoIndex);
+    const Outcome outcome = Ctl({"remove", "/gone/x", "/photos"});
+    EXPECT_EQ(outcome.status, kDone) << outcome.error;
+    EXPECT_FALSE(Exists(kPhotoIndex));
+    EXPECT_THAT(ReadJson(kFolders).getMemberNames(), ElementsAre("/media"));
+    EXPECT_THAT(Told(), ElementsAre(R"(command delete_folder_setting {"folder_path":"/gone/x"})",
+                                    R"(command delete_folder_setting {"folder_path":"/photos"})"));
+}
+
+TEST_F(CtlTest, RemoveSaysThatTheSettingsAreLocked) {
+    Save(kWithGone);
+    const HoldLock other(kFolderLock);
+    for (const char *path : {"/gone/x", "/photos"}) {
+        const Outcome outcome = Ctl({"remove", path});
+        EXPECT_EQ(outcome.status, kFailed);
+        EXPECT_THAT(outcome.error,
+                    HasSubstr(std::string("Cannot remove ") + path + ": the settings are locked"));
+    }
+    EXPECT_EQ(ReadText(kFolders), kWithGone);
+}
+
 } // namespace
 } // namespace VANO::TESTS
