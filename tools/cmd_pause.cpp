@@ -1,21 +1,23 @@
-#include <fileindex/status_mgr.h>
+#include <fileindex/daemon_socket.h>
+#include <fileindex/status.h>
 #include <iostream>
 #include <limits>
 #include <memory>
 
 #include "command.h"
 #include "messages.h"
+#include "time_text.h"
 #include "times.h"
 
 namespace CTL {
 
 namespace {
 
-namespace fileindex = VANO::FILEINDEX;
+using VANO::FILEINDEX::Status;
 
 constexpr char kFooter[] =
-    R"(The service counts whole hours: what lies between them is rounded up. Without an
-option the pause has no end.
+    R"(Without an option the pause has no end. 07:30 is the next time that the clock
+shows it.
 
 Examples:
   fileindexctl pause
@@ -24,79 +26,67 @@ Examples:
   fileindexctl pause --until 07:30
   fileindexctl pause --until "2026-12-24 18:00")";
 
-constexpr long long kSecondsPerHour = 3600;
+// The service keeps the end of a pause in 32 bits.
+constexpr long long kLatestEnd = std::numeric_limits<std::int32_t>::max();
 
 struct Options {
     std::string duration;
     std::string until;
     bool isForever = false; // as without any option
+    long long resumeTime = kPausedWithoutEnd;
     bool isDryRun = false;
-    long long seconds = 0; // 0 for no end
 };
 
-// The library keeps the end of a pause in 32 bits.
-long long MostHours(std::time_t now) {
-    return (std::numeric_limits<std::int32_t>::max() - now) / kSecondsPerHour;
-}
-
-int HoursOf(const Options &options) {
-    return static_cast<int>((options.seconds + kSecondsPerHour - 1) / kSecondsPerHour);
-}
-
-void SayRounding(const Options &options) {
-    if (options.seconds % kSecondsPerHour != 0) {
-        Advise("The service counts whole hours: rounded up to " + std::to_string(HoursOf(options)) +
-               " h.");
-    }
-}
-
-ExitCode Preview(const Options &options) {
-    const std::time_t end = std::time(nullptr) + HoursOf(options) * kSecondsPerHour;
-    std::cout << "Would pause indexing until "
-              << (options.seconds == 0 ? "fileindexctl resume" : TimeText(end)) << ".\n";
-    SayRounding(options);
-    return kDone;
+// What StatusMgr::Pause() does, which takes whole hours only.
+bool PauseUntil(long long resumeTime) {
+    Status status;
+    const auto unlock = [](Status *locked) { locked->Unlock(); };
+    const std::unique_ptr<Status, decltype(unlock)> lock(&status, unlock);
+    Json::Value parameters(Json::objectValue);
+    parameters["resume_time"] = Json::Int64{resumeTime};
+    return status.Lock(true) && status.Load() && status.Pause(resumeTime) && status.Save() &&
+           VANO::FILEINDEX::SendCammandToDaemon("pause", parameters);
 }
 
 ExitCode Run(const Options &options) {
+    const long long resumeTime = options.resumeTime;
     if (options.isDryRun) {
-        return Preview(options);
+        std::cout << "Would pause indexing until " << EndText(resumeTime, std::time(nullptr))
+                  << ".\n";
+        return kDone;
     }
-    const int hours = HoursOf(options);
-    if (!While("Telling the daemon", [&] { return fileindex::StatusMgr::Pause(hours); })) {
+    if (!While("Telling the daemon", [&] { return PauseUntil(resumeTime); })) {
         return IsUnsaved() ? Fail("Cannot pause indexing")
                            : FailHalfWay("The pause is saved", kDaemonAdvice);
     }
-    long long resumeTime = 0;
-    if (hours == 0 || !fileindex::StatusMgr::GetPauseInfo(resumeTime)) {
-        Say("Indexing is paused, until fileindexctl resume.");
-    } else {
-        Say("Indexing is paused until " + TimeText(resumeTime) + ".");
+    Say("Indexing is " + PauseText(resumeTime, std::time(nullptr)) + ".");
+    if (resumeTime == kPausedWithoutEnd) {
+        Advise("fileindexctl resume ends the pause.");
     }
-    SayRounding(options);
     return kDone;
 }
 
 void ReadTimes(Options &options) {
+    if (options.duration.empty() && options.until.empty()) {
+        return;
+    }
     const std::time_t now = std::time(nullptr);
+    long long seconds = 0;
     std::time_t end = 0;
-    if (!options.duration.empty() && !ReadDuration(options.seconds, options.duration)) {
+    if (!options.duration.empty() && !ReadDuration(seconds, options.duration)) {
         throw CLI::ValidationError("--for is a number with d, h or m, such as 8h or 1d12h, not '" +
                                    options.duration + "'");
     }
-    if (!options.until.empty()) {
-        if (!ReadMoment(end, options.until, now)) {
-            throw CLI::ValidationError("--until is a time such as 07:30 or '2026-12-24 18:00', "
-                                       "not '" +
-                                       options.until + "'");
-        }
-        options.seconds = end - now;
+    if (!options.until.empty() && !ReadMoment(end, options.until, now)) {
+        throw CLI::ValidationError("--until is a time such as 07:30 or '2026-12-24 18:00', "
+                                   "not '" +
+                                   options.until + "'");
     }
-    const bool hasEnd = !options.duration.empty() || !options.until.empty();
-    if (hasEnd && options.seconds <= 0) {
+    options.resumeTime = options.until.empty() ? now + seconds : end;
+    if (options.resumeTime <= now) {
         throw CLI::ValidationError("That pause would be over at once");
     }
-    if (options.seconds > MostHours(now) * kSecondsPerHour) {
+    if (options.resumeTime > kLatestEnd) {
         throw CLI::ValidationError("The service cannot count so far: use --forever");
     }
 }

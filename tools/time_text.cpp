@@ -6,7 +6,6 @@ namespace CTL {
 
 namespace {
 
-constexpr long long kPausedWithoutEnd = 0;
 constexpr long long kMinute = 60;
 constexpr long long kHour = 60 * kMinute;
 constexpr long long kDay = 24 * kHour;
@@ -43,16 +42,22 @@ bool IsPaused(long long resumeTime, std::time_t now) {
     return resumeTime == kPausedWithoutEnd || resumeTime > static_cast<long long>(now);
 }
 
+std::string EndText(long long resumeTime, std::time_t now) {
+    if (resumeTime == kPausedWithoutEnd) {
+        return "resumed";
+    }
+    const long long left = resumeTime - static_cast<long long>(now);
+    return Format(left < kPlainWeekdays ? "%a %H:%M" : "%F %H:%M", resumeTime);
+}
+
 std::string PauseText(long long resumeTime, std::time_t now) {
     if (!IsPaused(resumeTime, now)) {
         return "not paused";
     }
-    if (resumeTime == kPausedWithoutEnd) {
-        return "paused until resumed";
-    }
-    const long long left = resumeTime - static_cast<long long>(now);
-    return "paused until " + Format(left < kPlainWeekdays ? "%a %H:%M" : "%F %H:%M", resumeTime) +
-           ", " + DurationText(left) + " left";
+    const std::string text = "paused until " + EndText(resumeTime, now);
+    return resumeTime == kPausedWithoutEnd
+               ? text
+               : text + ", " + DurationText(resumeTime - static_cast<long long>(now)) + " left";
 }
 
 std::string StampText(std::time_t time) {

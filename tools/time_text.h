@@ -6,14 +6,19 @@
 
 namespace CTL {
 
+constexpr long long kPausedWithoutEnd = 0;
+
 // "45 s", "20 min", "6 h" or "3 days": one rounded number; what is negative counts as nothing.
 [[nodiscard]] std::string DurationText(long long seconds);
 
 // Whether indexing is paused at `now`. `resumeTime` is what StatusMgr::GetPauseInfo() gives.
 [[nodiscard]] bool IsPaused(long long resumeTime, std::time_t now);
 
-// "paused until Sat 07:30, 6 h left" in local time, with the date where the day is not one of the
-// next six; "paused until resumed" or "not paused".
+// Until when: "Sat 07:30" in local time, with the date where the day is not one of the next six, or
+// "resumed".
+[[nodiscard]] std::string EndText(long long resumeTime, std::time_t now);
+
+// "paused until Sat 07:30, 6 h left", "paused until resumed" or "not paused".
 [[nodiscard]] std::string PauseText(long long resumeTime, std::time_t now);
 
 // "2026-11-21T13:22:00+0100", for logs and scripts.

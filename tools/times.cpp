@@ -84,13 +84,4 @@ bool ReadMoment(std::time_t &moment, const std::string &text, std::time_t now) {
            NextOnClock(moment, time, now);
 }
 
-std::string TimeText(std::time_t time) {
-    std::tm local{};
-    char text[64] = "";
-    if (::localtime_r(&time, &local) != nullptr) {
-        (void)std::strftime(text, sizeof(text), "%Y-%m-%d %H:%M", &local);
-    }
-    return text;
-}
-
 } // namespace CTL

@@ -4,6 +4,8 @@
 #include <ctime>
 #include <string>
 
+// Times that a user types; time_text.h has those that are shown.
+
 namespace CTL {
 
 // Reads "8h", "90m", "2d" or several of them, "1h30m", into seconds.
@@ -11,9 +13,6 @@ namespace CTL {
 
 // Reads "07:30", the next time that the clock shows it, or "2026-11-22 07:30", in local time.
 [[nodiscard]] bool ReadMoment(std::time_t &moment, const std::string &text, std::time_t now);
-
-// "2026-11-22 07:30", in local time.
-[[nodiscard]] std::string TimeText(std::time_t time);
 
 } // namespace CTL
 

@@ -82,6 +82,7 @@ INSTANTIATE_TEST_SUITE_P(
         Mistake{"PauseUntilNoHour", {"pause", "--until", "25:00"}, "not '25:00'"},
         Mistake{"PauseUntilNoDay", {"pause", "--until", "2030-02-30 10:00"}, "not '2030-02-30"},
         Mistake{"PauseUntilPast", {"pause", "--until", "2020-01-01 10:00"}, "over at once"},
+        Mistake{"PauseUntilTheEpoch", {"pause", "--until", "1970-01-01 00:00"}, "over at once"},
         Mistake{"PauseTwice", {"pause", "--for", "1h", "--until", "07:30"}, "excludes"},
         Mistake{"PauseForeverAndNot", {"pause", "--forever", "--for", "1h"}, "excludes"},
         Mistake{"PauseSurplus", {"pause", "8"}, "8"},

@@ -10,13 +10,11 @@ using ::testing::AllOf;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
-using ::testing::Not;
-using ::testing::StartsWith;
 
-std::string LocalText(std::time_t time) {
+std::string LocalText(std::time_t time, const char *format = "%Y-%m-%d %H:%M") {
     std::tm local{};
     char text[64];
-    std::strftime(text, sizeof(text), "%Y-%m-%d %H:%M", ::localtime_r(&time, &local));
+    std::strftime(text, sizeof(text), format, ::localtime_r(&time, &local));
     return text;
 }
 
@@ -27,22 +25,24 @@ TEST_F(CtlTest, PauseWithoutATimeHasNoEnd) {
         const Outcome outcome = Ctl(arguments);
         EXPECT_EQ(outcome.status, kDone);
         EXPECT_EQ(outcome.out, "");
-        EXPECT_EQ(outcome.error, "fileindexctl: Indexing is paused, until fileindexctl resume.\n");
+        EXPECT_EQ(outcome.error, "fileindexctl: Indexing is paused until resumed.\n"
+                                 "  fileindexctl resume ends the pause.\n");
         EXPECT_EQ(ReadText(kStatus), R"({"resume_time":0})");
     }
     EXPECT_THAT(Told(), ElementsAre(R"(command pause {"resume_time":0})",
                                     R"(command pause {"resume_time":0})"));
 }
 
-TEST_F(CtlTest, PauseForHoursSaysUntilWhen) {
+TEST_F(CtlTest, PauseSaysUntilWhenAsStatusDoes) {
     StartDaemon();
-    const std::time_t before = std::time(nullptr);
     const Outcome outcome = Ctl({"pause", "--for", "8h"});
     EXPECT_EQ(outcome.status, kDone);
     const std::time_t until = ReadJson(kStatus)["resume_time"].asInt64();
-    EXPECT_GE(until, before + 8 * 3600);
-    EXPECT_LE(until, std::time(nullptr) + 8 * 3600);
-    EXPECT_EQ(outcome.error, "fileindexctl: Indexing is paused until " + LocalText(until) + ".\n");
+    const std::string text = "paused until " + LocalText(until, "%a %H:%M") + ", 8 h left";
+    EXPECT_EQ(outcome.error, "fileindexctl: Indexing is " + text + ".\n");
+    EXPECT_THAT(Ctl({"status"}).out, HasSubstr("Indexing: " + text + "\n"));
+    EXPECT_THAT(Told(),
+                ElementsAre("command pause {\"resume_time\":" + std::to_string(until) + "}"));
 }
 
 TEST_F(CtlTest, ResumeEndsThePause) {
@@ -78,65 +78,60 @@ TEST_F(CtlTest, PauseOfABrokenStatusFileFails) {
     EXPECT_THAT(Told(), IsEmpty());
 }
 
+TEST_F(CtlTest, PauseOfALockedStatusFileFails) {
+    StartDaemon();
+    const HoldLock other(kStatusLock);
+    const Outcome outcome = Ctl({"pause"});
+    EXPECT_EQ(outcome.status, kFailed);
+    EXPECT_THAT(outcome.error, HasSubstr("Cannot pause indexing: the settings are locked"));
+    EXPECT_FALSE(Exists(kStatus));
+    EXPECT_THAT(Told(), IsEmpty());
+}
+
 struct Length {
     const char *what;
     const char *text;
-    long long hours; // that the library is asked for
+    long long seconds;
 
     friend void PrintTo(const Length &length, std::ostream *out) { *out << length.what; }
 };
 
 class PauseLengthTest : public CtlTest, public ::testing::WithParamInterface<Length> {};
 
-TEST_P(PauseLengthTest, IsRoundedUpToWholeHours) {
+TEST_P(PauseLengthTest, IsKeptToTheSecond) {
     StartDaemon();
     const std::time_t before = std::time(nullptr);
     ASSERT_EQ(Ctl({"pause", "--for", GetParam().text}).status, kDone);
     const std::time_t until = ReadJson(kStatus)["resume_time"].asInt64();
-    EXPECT_GE(until, before + GetParam().hours * 3600);
-    EXPECT_LE(until, std::time(nullptr) + GetParam().hours * 3600);
+    EXPECT_GE(until, before + GetParam().seconds);
+    EXPECT_LE(until, std::time(nullptr) + GetParam().seconds);
+    EXPECT_FALSE(IsLocked(kStatusLock));
 }
 
 INSTANTIATE_TEST_SUITE_P(Lengths, PauseLengthTest,
-                         ::testing::Values(Length{"Hours", "8h", 8}, Length{"Days", "2d", 48},
-                                           Length{"Minutes", "60m", 1},
-                                           Length{"PartOfAnHour", "1m", 1},
-                                           Length{"MoreThanAnHour", "61m", 2},
-                                           Length{"Several", "1d1h30m", 26}),
+                         ::testing::Values(Length{"Hours", "8h", 8 * 3600},
+                                           Length{"Days", "2d", 48 * 3600},
+                                           Length{"Minute", "1m", 60},
+                                           Length{"Several", "1d1h30m", 25 * 3600 + 1800}),
                          [](const auto &row) { return row.param.what; });
 
-TEST_F(CtlTest, PauseSaysThatItRoundsUp) {
+TEST_F(CtlTest, PauseUntilATimeEndsThen) {
     StartDaemon();
-    EXPECT_THAT(Ctl({"pause", "--for", "90m"}).error,
-                HasSubstr("\n  The service counts whole hours: rounded up to 2 h.\n"));
-    EXPECT_THAT(Ctl({"pause", "--for", "2h"}).error, Not(HasSubstr("rounded")));
-}
-
-TEST_F(CtlTest, PauseUntilATimeOfTheDayLastsAtMostADay) {
-    StartDaemon();
-    const std::time_t soon = std::time(nullptr) + 90; // never the minute that is running
-    const std::time_t ago = std::time(nullptr) - 90;
-    ASSERT_EQ(Ctl({"pause", "--until", LocalText(soon).substr(11)}).status, kDone);
-    EXPECT_LE(ReadJson(kStatus)["resume_time"].asInt64(), std::time(nullptr) + 3600);
-    ASSERT_EQ(Ctl({"pause", "--until", LocalText(ago).substr(11)}).status, kDone);
-    EXPECT_GT(ReadJson(kStatus)["resume_time"].asInt64(), std::time(nullptr) + 23 * 3600);
-    EXPECT_LE(ReadJson(kStatus)["resume_time"].asInt64(), std::time(nullptr) + 24 * 3600);
-}
-
-TEST_F(CtlTest, PauseUntilADayReachesIt) {
-    StartDaemon();
-    const std::time_t day = std::time(nullptr) + 10 * 24 * 3600;
-    ASSERT_EQ(Ctl({"pause", "--until", LocalText(day)}).status, kDone);
-    const std::time_t until = ReadJson(kStatus)["resume_time"].asInt64();
-    EXPECT_GE(until, day - day % 60);
-    EXPECT_LE(until, day + 3600);
+    const std::time_t now = std::time(nullptr);
+    for (const std::time_t end : {now + 90, now + 10 * 24 * 3600}) {
+        const std::string text = LocalText(end);
+        ASSERT_EQ(Ctl({"pause", "--until", text}).status, kDone);
+        EXPECT_EQ(ReadJson(kStatus)["resume_time"].asInt64(), end - end % 60) << text;
+    }
+    ASSERT_EQ(Ctl({"pause", "--until", LocalText(now + 90).substr(11)}).status, kDone);
+    EXPECT_EQ(ReadJson(kStatus)["resume_time"].asInt64(), now + 90 - (now + 90) % 60);
 }
 
 TEST_F(CtlTest, PauseAndResumeDryRunTellAndDoNothing) {
     StartDaemon();
-    EXPECT_EQ(Ctl({"pause", "--dry-run"}).out, "Would pause indexing until fileindexctl resume.\n");
-    EXPECT_THAT(Ctl({"pause", "--for", "1h", "--dry-run"}).out,
-                StartsWith("Would pause indexing until 2"));
+    EXPECT_EQ(Ctl({"pause", "--dry-run"}).out, "Would pause indexing until resumed.\n");
+    EXPECT_EQ(Ctl({"pause", "--until", "2037-12-24 18:00", "--dry-run"}).out,
+              "Would pause indexing until 2037-12-24 18:00.\n");
     EXPECT_EQ(Ctl({"resume", "--dry-run"}).out, "Would end any pause and tell the daemon.\n");
     EXPECT_FALSE(Exists(kStatus));
     EXPECT_THAT(Told(), IsEmpty());
