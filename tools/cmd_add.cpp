@@ -1,5 +1,6 @@
 #include <memory>
 
+#include "change.h"
 #include "command.h"
 #include "folder_request.h"
 #include "folder_view.h"
@@ -23,7 +24,7 @@ struct Options {
     std::string name;
     std::array<bool, kFileTypes.size()> types{};
     bool all = false;
-    bool isDryRun = false;
+    Change change;
 };
 
 Json::Value RequestOf(const Options &options) {
@@ -39,9 +40,8 @@ Json::Value RequestOf(const Options &options) {
     return RequestFor(ToSharePaths(options.paths), members);
 }
 
-ExitCode Run(const Options &options) {
-    const Json::Value request = RequestOf(options);
-    return options.isDryRun ? Preview(request, kWording) : Save(request, kWording);
+ExitCode Run(Options &options) {
+    return Apply(options.change, RequestOf(options), kWording);
 }
 
 void Check(const Options &options) {
@@ -68,10 +68,9 @@ Action DeclareAdd(CLI::App &app) {
         app.add_flag(std::string("--") + kFileTypes[i], options->types[i], meanings[i]);
     }
     app.add_flag("--all", options->all, "Index all of these");
-    AddDryRunOption(app, options->isDryRun);
     app.footer(kFooter);
     app.callback([options] { Check(*options); });
-    return [options] { return Run(*options); };
+    return MakeChange(app, options->change, [options] { return Run(*options); });
 }
 
 } // namespace CTL

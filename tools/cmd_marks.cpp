@@ -1,9 +1,7 @@
-#include <algorithm>
-#include <fileindex/status.h>
 #include <fileindex/status_mgr.h>
-#include <iostream>
 #include <memory>
 
+#include "change.h"
 #include "command.h"
 #include "messages.h"
 #include "output.h"
@@ -76,12 +74,13 @@ Action DeclareList(CLI::App &app) {
 
 struct SetOptions {
     std::string name;
-    bool isDryRun = false;
+    Change change;
 };
 
-ExitCode RunSet(const SetOptions &options) {
-    if (options.isDryRun) {
-        std::cout << "Would mark " << Shown(options.name) << " as done.\n";
+ExitCode RunSet(SetOptions &options) {
+    options.change.facts["marks"].append(options.name);
+    if (options.change.isDryRun) {
+        options.change.Would("mark " + Shown(options.name) + " as done");
         return kDone;
     }
     if (!StatusMgr::SetUpdated(options.name)) {
@@ -94,9 +93,8 @@ ExitCode RunSet(const SetOptions &options) {
 Action DeclareSetMark(CLI::App &app) {
     const auto options = std::make_shared<SetOptions>();
     app.add_option("MARK", options->name, "Name of the step")->required()->check(CheckName);
-    AddDryRunOption(app, options->isDryRun);
     app.footer(kFooter);
-    return [options] { return RunSet(*options); };
+    return MakeChange(app, options->change, [options] { return RunSet(*options); });
 }
 
 const std::vector<Command> kMarksCommands = {

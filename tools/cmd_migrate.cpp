@@ -1,10 +1,12 @@
 #include <fileindex/index_mgr.h>
 #include <fileindex/migration.h>
-#include <iostream>
 #include <memory>
 
+#include "change.h"
 #include "command.h"
+#include "folder_view.h"
 #include "messages.h"
+#include "paths.h"
 #include "text.h"
 
 namespace CTL {
@@ -21,25 +23,26 @@ Examples:
   fileindexctl migrate --dry-run
   fileindexctl migrate)";
 
-void Preview(const std::vector<Folder> &folders) {
+void Preview(const std::vector<Folder> &folders, const Change &change) {
     if (folders.empty()) {
-        std::cout << "Would stop fileindexd: no folder is indexed.\n";
+        change.Would("stop fileindexd: no folder is indexed");
         return;
     }
-    std::cout << "Would start fileindexd and switch Spotlight on.\n"
-                 "Would have every share with indexed folders watched.\n";
+    change.Would("start fileindexd and switch Spotlight on");
+    change.Would("have every share with indexed folders watched");
     for (const Folder &folder : folders) {
-        std::cout << "Would queue " << Shown(folder.path) << " for a new index.\n";
+        change.Would("queue " + Shown(folder.path) + " for a new index");
     }
 }
 
-ExitCode Run(bool isDryRun) {
+ExitCode Run(Change &change) {
     std::vector<Folder> folders;
     if (!VANO::FILEINDEX::IndexMgr::List(folders)) {
         return Fail("Cannot migrate");
     }
-    if (isDryRun) {
-        Preview(folders);
+    change.facts["paths"] = ArrayOf(PathsOf(folders));
+    if (change.isDryRun) {
+        Preview(folders, change);
         return kDone;
     }
     if (!While("Bringing the services into line",
@@ -55,10 +58,9 @@ ExitCode Run(bool isDryRun) {
 } // namespace
 
 Action DeclareMigrate(CLI::App &app) {
-    const auto isDryRun = std::make_shared<bool>(false);
-    AddDryRunOption(app, *isDryRun);
+    const auto change = std::make_shared<Change>();
     app.footer(kFooter);
-    return [isDryRun] { return Run(*isDryRun); };
+    return MakeChange(app, *change, [change] { return Run(*change); });
 }
 
 } // namespace CTL

@@ -1,9 +1,9 @@
 #include <fileindex/daemon_socket.h>
 #include <fileindex/status.h>
-#include <iostream>
 #include <limits>
 #include <memory>
 
+#include "change.h"
 #include "command.h"
 #include "messages.h"
 #include "time_text.h"
@@ -34,7 +34,7 @@ struct Options {
     std::string until;
     bool isForever = false; // as without any option
     long long resumeTime = kPausedWithoutEnd;
-    bool isDryRun = false;
+    Change change;
 };
 
 // What StatusMgr::Pause() does, which takes whole hours only.
@@ -48,11 +48,11 @@ bool PauseUntil(long long resumeTime) {
            VANO::FILEINDEX::SendCammandToDaemon("pause", parameters);
 }
 
-ExitCode Run(const Options &options) {
+ExitCode Run(Options &options) {
     const long long resumeTime = options.resumeTime;
-    if (options.isDryRun) {
-        std::cout << "Would pause indexing until " << EndText(resumeTime, std::time(nullptr))
-                  << ".\n";
+    options.change.facts["resume_time"] = Json::Int64{resumeTime};
+    if (options.change.isDryRun) {
+        options.change.Would("pause indexing until " + EndText(resumeTime, std::time(nullptr)));
         return kDone;
     }
     if (!While("Telling the daemon", [&] { return PauseUntil(resumeTime); })) {
@@ -103,7 +103,6 @@ Action DeclarePause(CLI::App &app) {
     app.add_flag("--forever", options->isForever, "Until fileindexctl resume")
         ->excludes(duration)
         ->excludes(until);
-    AddDryRunOption(app, options->isDryRun);
     app.footer(kFooter);
     app.callback([options, duration, until] {
         // An empty word is no time, but CLI11 hands it on as if none had been given.
@@ -114,7 +113,7 @@ Action DeclarePause(CLI::App &app) {
         }
         ReadTimes(*options);
     });
-    return [options] { return Run(*options); };
+    return MakeChange(app, options->change, [options] { return Run(*options); });
 }
 
 } // namespace CTL

@@ -1,7 +1,7 @@
 #include <fileindex/index_mgr.h>
-#include <iostream>
 #include <memory>
 
+#include "change.h"
 #include "command.h"
 #include "messages.h"
 #include "paths.h"
@@ -27,13 +27,14 @@ Examples:
 struct Options {
     std::vector<std::string> paths;
     bool all = false;
-    bool isDryRun = false;
+    Change change;
 };
 
-ExitCode Queue(const std::vector<std::string> &paths, const Options &options) {
-    if (options.isDryRun) {
+ExitCode Queue(const std::vector<std::string> &paths, Change &change) {
+    change.facts["paths"] = ArrayOf(paths);
+    if (change.isDryRun) {
         for (const std::string &path : paths) {
-            std::cout << "Would queue " << Shown(path) << " for a new index.\n";
+            change.Would("queue " + Shown(path) + " for a new index");
         }
         return kDone;
     }
@@ -44,7 +45,7 @@ ExitCode Queue(const std::vector<std::string> &paths, const Options &options) {
     return kDone;
 }
 
-ExitCode QueuePaths(const Options &options, const std::vector<Folder> &folders) {
+ExitCode QueuePaths(Options &options, const std::vector<Folder> &folders) {
     const std::vector<std::string> paths = ToSharePaths(options.paths);
     std::vector<std::string> unknown;
     for (const std::string &path : paths) {
@@ -59,10 +60,10 @@ ExitCode QueuePaths(const Options &options, const std::vector<Folder> &folders) 
         Advise("fileindexctl add indexes a folder.");
         return kNotFound;
     }
-    return Queue(paths, options);
+    return Queue(paths, options.change);
 }
 
-ExitCode QueueAll(const Options &options, const std::vector<Folder> &folders) {
+ExitCode QueueAll(Options &options, const std::vector<Folder> &folders) {
     std::vector<std::string> paths;
     std::vector<std::string> gone;
     for (const Folder &folder : folders) {
@@ -70,7 +71,7 @@ ExitCode QueueAll(const Options &options, const std::vector<Folder> &folders) {
     }
     ExitCode result = kNotFound;
     if (!paths.empty()) {
-        result = Queue(paths, options);
+        result = Queue(paths, options.change);
     }
     if (folders.empty()) {
         Say("No folder is indexed.");
@@ -83,7 +84,7 @@ ExitCode QueueAll(const Options &options, const std::vector<Folder> &folders) {
     return result;
 }
 
-ExitCode Run(const Options &options) {
+ExitCode Run(Options &options) {
     std::vector<Folder> folders;
     if (!IndexMgr::List(folders)) {
         return Fail("Cannot index anything again");
@@ -98,14 +99,13 @@ Action DeclareReindex(CLI::App &app) {
     CLI::Option *paths = AddPathsTo(app, options->paths, "Paths in indexed folders, or above some");
     paths->check(CheckSharePath)->required(false);
     app.add_flag("--all", options->all, "Every indexed folder")->excludes(paths);
-    AddDryRunOption(app, options->isDryRun);
     app.footer(kFooter);
     app.callback([options] {
         if (options->paths.empty() && !options->all) {
             throw CLI::ValidationError("Say what to index again: PATH... or --all");
         }
     });
-    return [options] { return Run(*options); };
+    return MakeChange(app, options->change, [options] { return Run(*options); });
 }
 
 } // namespace CTL

@@ -1,10 +1,10 @@
 #include <algorithm>
 #include <fileindex/index_mgr.h>
 #include <fileindex/share_path.h>
-#include <iostream>
 #include <memory>
 #include <set>
 
+#include "change.h"
 #include "command.h"
 #include "folder_view.h"
 #include "messages.h"
@@ -29,7 +29,7 @@ Examples:
 
 struct Options {
     std::vector<std::string> paths;
-    bool isDryRun = false;
+    Change change;
 };
 
 std::string ShareOf(const std::string &path) {
@@ -68,20 +68,6 @@ std::vector<std::string> SharesToClean(const std::vector<std::string> &paths,
         }
     }
     return shares;
-}
-
-ExitCode Preview(const std::vector<std::string> &paths, const std::vector<Folder> &folders) {
-    const std::vector<std::string> left = Left(folders, paths);
-    for (const std::string &path : paths) {
-        std::cout << "Would remove " << Shown(path) << ".\n";
-    }
-    for (const std::string &share : SharesToClean(paths, left)) {
-        std::cout << "Would delete the index of share " << Shown(share) << ".\n";
-    }
-    if (left.empty()) {
-        std::cout << "Would stop fileindexd and switch Spotlight off: no folder would be left.\n";
-    }
-    return kDone;
 }
 
 // Drops the settings of shares that are gone. The library does that too, and then fails for their
@@ -139,8 +125,9 @@ ExitCode SayMisspelt(const std::string &asked) {
     return kFailed;
 }
 
-ExitCode Run(const Options &options) {
+ExitCode Run(Options &options) {
     const std::vector<std::string> paths = ToSharePaths(options.paths);
+    options.change.facts["paths"] = ArrayOf(paths);
     std::vector<Folder> folders;
     if (!IndexMgr::List(folders)) {
         return Fail("Cannot remove " + Named(paths));
@@ -158,7 +145,22 @@ ExitCode Run(const Options &options) {
         Advise("fileindexctl list shows the folders that are.");
         return kNotFound;
     }
-    return options.isDryRun ? Preview(paths, folders) : Remove(paths);
+    const std::vector<std::string> left = Left(folders, paths);
+    const std::vector<std::string> cleaned = SharesToClean(paths, left);
+    options.change.facts["shares"] = ArrayOf(cleaned);
+    if (!options.change.isDryRun) {
+        return Remove(paths);
+    }
+    for (const std::string &path : paths) {
+        options.change.Would("remove " + Shown(path));
+    }
+    for (const std::string &share : cleaned) {
+        options.change.Would("delete the index of share " + Shown(share));
+    }
+    if (left.empty()) {
+        options.change.Would("stop fileindexd and switch Spotlight off: no folder would be left");
+    }
+    return kDone;
 }
 
 } // namespace
@@ -166,9 +168,8 @@ ExitCode Run(const Options &options) {
 Action DeclareRemove(CLI::App &app) {
     const auto options = std::make_shared<Options>();
     AddPathsTo(app, options->paths, "Folders, by share path or full path")->check(CheckSharePath);
-    AddDryRunOption(app, options->isDryRun);
     app.footer(kFooter);
-    return [options] { return Run(*options); };
+    return MakeChange(app, options->change, [options] { return Run(*options); });
 }
 
 } // namespace CTL

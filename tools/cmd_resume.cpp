@@ -1,7 +1,7 @@
 #include <fileindex/status_mgr.h>
-#include <iostream>
 #include <memory>
 
+#include "change.h"
 #include "command.h"
 #include "messages.h"
 
@@ -15,9 +15,9 @@ constexpr char kFooter[] = R"(Examples:
   fileindexctl resume
   fileindexctl resume --dry-run)";
 
-ExitCode Run(bool isDryRun) {
-    if (isDryRun) {
-        std::cout << "Would end any pause and tell the daemon.\n";
+ExitCode Run(const Change &change) {
+    if (change.isDryRun) {
+        change.Would("end any pause and tell the daemon");
         return kDone;
     }
     if (!While("Telling the daemon", [] { return fileindex::StatusMgr::Resume(); })) {
@@ -31,10 +31,9 @@ ExitCode Run(bool isDryRun) {
 } // namespace
 
 Action DeclareResume(CLI::App &app) {
-    const auto isDryRun = std::make_shared<bool>(false);
-    AddDryRunOption(app, *isDryRun);
+    const auto change = std::make_shared<Change>();
     app.footer(kFooter);
-    return [isDryRun] { return Run(*isDryRun); };
+    return MakeChange(app, *change, [change] { return Run(*change); });
 }
 
 } // namespace CTL

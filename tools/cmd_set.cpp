@@ -1,6 +1,7 @@
 #include <fileindex/index_mgr.h>
 #include <memory>
 
+#include "change.h"
 #include "command.h"
 #include "folder_request.h"
 #include "folder_view.h"
@@ -30,7 +31,7 @@ struct Options {
     std::string name;
     bool hasName = false;                             // it may be given as empty
     std::array<std::string, kFileTypes.size()> types; // "yes", "no" or, when not given, empty
-    bool isDryRun = false;
+    Change change;
 };
 
 Json::Value MembersOf(const Options &options) {
@@ -46,8 +47,9 @@ Json::Value MembersOf(const Options &options) {
     return members;
 }
 
-ExitCode Run(const Options &options) {
+ExitCode Run(Options &options) {
     const std::vector<std::string> paths = ToSharePaths(options.paths);
+    options.change.facts["paths"] = ArrayOf(paths);
     std::vector<Folder> folders;
     if (!IndexMgr::List(folders)) {
         return Fail("Cannot change " + Named(paths));
@@ -59,8 +61,7 @@ ExitCode Run(const Options &options) {
         Advise("fileindexctl list shows the folders that are, add sets more.");
         return kNotFound;
     }
-    const Json::Value request = RequestFor(paths, MembersOf(options));
-    return options.isDryRun ? Preview(request, kWording) : Save(request, kWording);
+    return Apply(options.change, RequestFor(paths, MembersOf(options)), kWording);
 }
 
 std::string CheckYesNo(const std::string &word) {
@@ -93,13 +94,12 @@ Action DeclareSet(CLI::App &app) {
             ->type_name("yes|no")
             ->check(CheckYesNo);
     }
-    AddDryRunOption(app, options->isDryRun);
     app.footer(kFooter);
     app.callback([options, name] {
         options->hasName = name->count() > 0;
         Check(*options);
     });
-    return [options] { return Run(*options); };
+    return MakeChange(app, options->change, [options] { return Run(*options); });
 }
 
 } // namespace CTL

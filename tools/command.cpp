@@ -26,8 +26,4 @@ Action DeclareCommands(CLI::App &app, const std::vector<Command> &table) {
     };
 }
 
-void AddDryRunOption(CLI::App &app, bool &isDryRun) {
-    app.add_flag("--dry-run", isDryRun, "Only tell what would be done");
-}
-
 } // namespace CTL

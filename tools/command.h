@@ -30,9 +30,6 @@ struct Command {
 // Makes the table's commands subcommands of `app`, one of which must be chosen; the result runs it.
 Action DeclareCommands(CLI::App &app, const std::vector<Command> &table);
 
-// The option --dry-run. `isDryRun` must outlive the parsing.
-void AddDryRunOption(CLI::App &app, bool &isDryRun);
-
 // One file each, cmd_<name>.cpp.
 Action DeclareAdd(CLI::App &app);
 Action DeclareDoctor(CLI::App &app);

@@ -4,11 +4,11 @@
 #include <fileindex/folders.h>
 #include <fileindex/index_mgr.h>
 #include <fileindex/share_path.h>
-#include <iostream>
 
 #include "folder_view.h"
 #include "index_refusal.h"
 #include "messages.h"
+#include "paths.h"
 #include "text.h"
 
 namespace CTL {
@@ -64,12 +64,14 @@ std::string ValueText(const Json::Value &value) {
 
 std::string Difference(const Json::Value &before, const Json::Value &after) {
     std::string text;
-    for (const char *key : {"name", "document", "audio", "video", "photo"}) {
+    const auto compare = [&](const char *key) {
         if (before[key] != after[key]) {
             text += (text.empty() ? "" : ", ") + std::string(key) + " from " +
                     ValueText(before[key]) + " to " + ValueText(after[key]);
         }
-    }
+    };
+    compare("name");
+    std::for_each(kFileTypes.begin(), kFileTypes.end(), compare);
     return text;
 }
 
@@ -77,28 +79,16 @@ std::string Effect(const Json::Value &before, const Json::Value &after) {
     const std::string path = Shown(after["path"].asString());
     if (before.isNull()) {
         const std::string types = TypesOf(after);
-        return "Would add " + path + (types.empty() ? "" : " for " + types) + ".";
+        return "add " + path + (types.empty() ? "" : " for " + types);
     }
     const std::string difference = Difference(before, after);
-    return difference.empty() ? "Would leave " + path + " as it is."
-                              : "Would change " + path + ": " + difference + ".";
+    return difference.empty() ? "leave " + path + " as it is"
+                              : "change " + path + ": " + difference;
 }
 
 Json::Value SettingOf(const Folders &folders, const std::string &path) {
     const auto found = folders.folders.find(path);
     return found == folders.folders.end() ? Json::Value() : found->second.asJson();
-}
-
-} // namespace
-
-Json::Value RequestFor(const std::vector<std::string> &paths, const Json::Value &members) {
-    Json::Value request(Json::arrayValue);
-    for (const std::string &path : paths) {
-        Json::Value folder = members;
-        folder["path"] = path;
-        request.append(folder);
-    }
-    return request;
 }
 
 ExitCode Save(const Json::Value &request, const Wording &wording) {
@@ -120,7 +110,7 @@ ExitCode Save(const Json::Value &request, const Wording &wording) {
     return kDone;
 }
 
-ExitCode Preview(const Json::Value &request, const Wording &wording) {
+ExitCode Preview(const Change &change, const Json::Value &request, const Wording &wording) {
     Folders folders; // never saved
     if (!folders.Load()) {
         return FailFor(request, wording);
@@ -135,9 +125,26 @@ ExitCode Preview(const Json::Value &request, const Wording &wording) {
         effects.push_back(Effect(before, SettingOf(folders, folder["path"].asString())));
     }
     for (const std::string &effect : effects) {
-        std::cout << effect << '\n';
+        change.Would(effect);
     }
     return kDone;
+}
+
+} // namespace
+
+Json::Value RequestFor(const std::vector<std::string> &paths, const Json::Value &members) {
+    Json::Value request(Json::arrayValue);
+    for (const std::string &path : paths) {
+        Json::Value folder = members;
+        folder["path"] = path;
+        request.append(folder);
+    }
+    return request;
+}
+
+ExitCode Apply(Change &change, const Json::Value &request, const Wording &wording) {
+    change.facts["paths"] = ArrayOf(PathsOf(request));
+    return change.isDryRun ? Preview(change, request, wording) : Save(request, wording);
 }
 
 } // namespace CTL

@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "change.h"
 #include "command.h"
 
 // A request that adds or changes folders: an array of folder objects with the members to change.
@@ -20,11 +21,9 @@ struct Wording {
     const char *done;    // "Added"
 };
 
-// Saves it and says so, and which of the folders cannot be indexed as they are.
-[[nodiscard]] ExitCode Save(const Json::Value &request, const Wording &wording);
-
-// Prints what Save() would change; fails where that would fail for the request itself.
-[[nodiscard]] ExitCode Preview(const Json::Value &request, const Wording &wording);
+// Saves it and says so, and which of the folders cannot be indexed as they are. A dry run tells
+// what that would change, and fails where it would fail for the request itself.
+[[nodiscard]] ExitCode Apply(Change &change, const Json::Value &request, const Wording &wording);
 
 } // namespace CTL
 

@@ -7,12 +7,16 @@ namespace CTL {
 
 using VANO::FILEINDEX::Folder;
 
+namespace {
+
 Json::Value AdditionalKeys() {
     Json::Value keys(Json::arrayValue);
     keys.append("status");
     keys.append("is_valid");
     return keys;
 }
+
+} // namespace
 
 Json::Value WithFacts(const Json::Value &folder) {
     Folder record;
@@ -48,6 +52,13 @@ Json::Value AsJson(const std::optional<Refusal> &refusal) {
         value["mend"] = refusal->mend;
     }
     return value;
+}
+
+std::vector<std::string> PathsOf(const std::vector<Folder> &folders) {
+    std::vector<std::string> paths;
+    std::transform(folders.begin(), folders.end(), std::back_inserter(paths),
+                   [](const Folder &folder) { return folder.path; });
+    return paths;
 }
 
 std::vector<Folder> Resolved(const std::vector<Folder> &folders) {

@@ -14,10 +14,7 @@ namespace CTL {
 
 inline constexpr std::array<const char *, 4> kFileTypes = {"document", "audio", "video", "photo"};
 
-// The facts that a listing asks the library for beside the setting itself.
-[[nodiscard]] Json::Value AdditionalKeys();
-
-// A folder of a list with these facts.
+// A folder of a list with the facts that the library tells beside the setting itself.
 [[nodiscard]] Json::Value WithFacts(const Json::Value &folder);
 
 // "photo,video" of a folder's JSON object.
@@ -28,6 +25,8 @@ inline constexpr std::array<const char *, 4> kFileTypes = {"document", "audio", 
 
 // {"rule", "why", "mend"}; null when there is none.
 [[nodiscard]] Json::Value AsJson(const std::optional<Refusal> &refusal);
+
+[[nodiscard]] std::vector<std::string> PathsOf(const std::vector<VANO::FILEINDEX::Folder> &folders);
 
 // Those whose share is there.
 [[nodiscard]] std::vector<VANO::FILEINDEX::Folder>

@@ -4,8 +4,8 @@
 #include <iostream>
 #include <memory>
 
+#include "change.h"
 #include "messages.h"
-#include "output.h"
 #include "share/commands.h"
 #include "shares.h"
 #include "text.h"
@@ -52,29 +52,47 @@ struct Options {
     bool set = false;
     bool clear = false;
     bool revive = false;
-    bool isDryRun = false;
-    JsonMode json = JsonMode::kOff;
+    Change change;
 
     [[nodiscard]] bool IsChange() const { return set || clear || revive; }
 };
 
-ExitCode Tell(const Options &options, const Mark &mark, const std::string &share) {
+// The share that is meant. Marks of shares that are gone can be told and cleared.
+ExitCode Find(std::string &name, const Options &options, const Mark &mark) {
+    ShareFacts share;
+    if (!LookUpShare(share, options.share)) {
+        return Fail("Cannot look up share " + Shown(options.share));
+    }
+    name = share.name;
+    return share.directory.empty() && !mark.has(name) ? SayNoShare(name) : kDone;
+}
+
+ExitCode Tell(const Options &options, const Mark &mark) {
+    std::string share;
+    if (const ExitCode found = Find(share, options, mark); found != kDone) {
+        return found;
+    }
     const bool hasMark = mark.has(share);
-    if (options.json != JsonMode::kOff) {
+    if (options.change.json != JsonMode::kOff) {
         Json::Value answer(Json::objectValue);
         answer["name"] = share;
         answer[mark.key] = hasMark;
-        PrintJson(answer, options.json);
+        PrintJson(answer, options.change.json);
     } else {
         std::cout << "Share " << Shown(share) << ' ' << (hasMark ? mark.yes : mark.no) << ".\n";
     }
     return hasMark ? kDone : kNotFound;
 }
 
-ExitCode Change(const Options &options, const Mark &mark, const std::string &share) {
+ExitCode ChangeMark(Options &options, const Mark &mark) {
+    std::string share;
+    if (const ExitCode found = Find(share, options, mark); found != kDone) {
+        return found;
+    }
+    options.change.facts["shares"].append(share);
     const std::string sentence = "hare " + Shown(share) + " " + (options.set ? mark.yes : mark.no);
-    if (options.isDryRun) {
-        std::cout << "Would see to it that s" << sentence << ".\n";
+    if (options.change.isDryRun) {
+        options.change.Would("see to it that s" + sentence);
         return kDone;
     }
     const bool isDone = While("Telling the indexing service", [&] {
@@ -88,16 +106,12 @@ ExitCode Change(const Options &options, const Mark &mark, const std::string &sha
                                           : Fail("Cannot change the mark of share " + Shown(share));
 }
 
-ExitCode Run(const Options &options, const Mark &mark) {
-    ShareFacts share;
-    if (!LookUpShare(share, options.share)) {
-        return Fail("Cannot look up share " + Shown(options.share));
-    }
-    // Marks of shares that are gone can be cleared.
-    if (share.directory.empty() && !mark.has(share.name)) {
-        return SayNoShare(share.name);
-    }
-    return options.IsChange() ? Change(options, mark, share.name) : Tell(options, mark, share.name);
+// `options` have been added to `app`, but for those of a change.
+Action TellOrChange(CLI::App &app, const std::shared_ptr<Options> &options, const Mark &mark) {
+    const Action change =
+        MakeChange(app, options->change, [options, &mark] { return ChangeMark(*options, mark); });
+    return
+        [options, &mark, change] { return options->IsChange() ? change() : Tell(*options, mark); };
 }
 
 std::shared_ptr<Options> AddMarkOptionsTo(CLI::App &app) {
@@ -105,8 +119,6 @@ std::shared_ptr<Options> AddMarkOptionsTo(CLI::App &app) {
     AddShareTo(app, "SHARE", options->share, "Name of the share");
     CLI::Option *set = app.add_flag("--set", options->set, "Set the mark");
     app.add_flag("--clear", options->clear, "Clear the mark")->excludes(set);
-    AddDryRunOption(app, options->isDryRun);
-    AddJsonOption(app, options->json);
     return options;
 }
 
@@ -119,13 +131,13 @@ Action DeclareShareNoSpace(CLI::App &app) {
         ->excludes(app.get_option("--set"))
         ->excludes(app.get_option("--clear"));
     app.footer(kNoSpaceFooter);
-    return [options] { return Run(*options, kNoSpace); };
+    return TellOrChange(app, options, kNoSpace);
 }
 
 Action DeclareShareNeedReindex(CLI::App &app) {
     const auto options = AddMarkOptionsTo(app);
     app.footer(kNeedReindexFooter);
-    return [options] { return Run(*options, kNeedReindex); };
+    return TellOrChange(app, options, kNeedReindex);
 }
 
 } // namespace CTL

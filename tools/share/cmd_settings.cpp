@@ -2,10 +2,12 @@
 
 #include <fileindex/index_mgr.h>
 #include <fileindex/share_path.h>
-#include <iostream>
 #include <memory>
 
+#include "change.h"
+#include "folder_view.h"
 #include "messages.h"
+#include "paths.h"
 #include "share/commands.h"
 #include "share_record.h"
 #include "shares.h"
@@ -35,10 +37,15 @@ Examples:
   fileindexctl share rename photos pictures
   fileindexctl share resume pictures)";
 
+struct RemoveOptions {
+    std::string share;
+    Change change;
+};
+
 struct RenameOptions {
     std::string old;
     std::string now;
-    bool isDryRun = false;
+    Change change;
 };
 
 ExitCode SayNoFolders(const std::string &share) {
@@ -51,7 +58,7 @@ std::string CountText(const std::vector<Folder> &folders) {
     return folders.size() == 1 ? "1 folder" : std::to_string(folders.size()) + " folders";
 }
 
-ExitCode RunRemove(const ShareOptions &options) {
+ExitCode RunRemove(RemoveOptions &options) {
     ShareFacts share;
     const std::string failure = "Cannot remove the folders of share " + Shown(options.share);
     if (!LookUpShare(share, options.share)) {
@@ -60,9 +67,11 @@ ExitCode RunRemove(const ShareOptions &options) {
     if (share.folders.empty()) {
         return SayNoFolders(share.name);
     }
-    if (options.isDryRun) {
+    options.change.facts["shares"].append(share.name);
+    options.change.facts["paths"] = ArrayOf(PathsOf(share.folders));
+    if (options.change.isDryRun) {
         for (const Folder &folder : share.folders) {
-            std::cout << "Would remove " << Shown(folder.path) << ".\n";
+            options.change.Would("remove " + Shown(folder.path));
         }
         return kDone;
     }
@@ -76,7 +85,7 @@ ExitCode RunRemove(const ShareOptions &options) {
     return kDone;
 }
 
-ExitCode RunRename(const RenameOptions &options) {
+ExitCode RunRename(RenameOptions &options) {
     ShareFacts share;
     const std::string own = OwnNameOf(options.now);
     const std::string now = own.empty() ? options.now : own;
@@ -87,16 +96,19 @@ ExitCode RunRename(const RenameOptions &options) {
     if (share.folders.empty()) {
         return SayNoFolders(share.name);
     }
+    options.change.facts["shares"].append(share.name);
+    options.change.facts["shares"].append(now);
+    options.change.facts["paths"] = ArrayOf(PathsOf(share.folders));
     if (own.empty()) {
         // To the library a new name that is no share's is a bad parameter; this names the reason.
         std::string fullPath;
         (void)VANO::FILEINDEX::GetFullPath(fullPath, "/" + now);
         return Fail("Cannot move the folders of " + what);
     }
-    if (options.isDryRun) {
+    if (options.change.isDryRun) {
         for (const Folder &folder : share.folders) {
-            std::cout << "Would move " << Shown(folder.path) << " to "
-                      << Shown(VANO::FILEINDEX::ReplaceShareName(folder.path, now)) << ".\n";
+            options.change.Would("move " + Shown(folder.path) + " to " +
+                                 Shown(VANO::FILEINDEX::ReplaceShareName(folder.path, now)));
         }
         return kDone;
     }
@@ -111,19 +123,18 @@ ExitCode RunRename(const RenameOptions &options) {
 } // namespace
 
 Action DeclareShareRemove(CLI::App &app) {
-    const auto options = std::make_shared<ShareOptions>();
-    AddShareOptionsTo(app, *options);
+    const auto options = std::make_shared<RemoveOptions>();
+    AddShareTo(app, "SHARE", options->share, "Name of the share");
     app.footer(kRemoveFooter);
-    return [options] { return RunRemove(*options); };
+    return MakeChange(app, options->change, [options] { return RunRemove(*options); });
 }
 
 Action DeclareShareRename(CLI::App &app) {
     const auto options = std::make_shared<RenameOptions>();
     AddShareTo(app, "OLD", options->old, "Name that the share had");
     AddShareTo(app, "NEW", options->now, "Name that it has now");
-    AddDryRunOption(app, options->isDryRun);
     app.footer(kRenameFooter);
-    return [options] { return RunRename(*options); };
+    return MakeChange(app, options->change, [options] { return RunRename(*options); });
 }
 
 } // namespace CTL

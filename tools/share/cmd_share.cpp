@@ -1,5 +1,6 @@
-#include "messages.h"
 #include "share/commands.h"
+
+#include "messages.h"
 #include "text.h"
 
 namespace CTL {
@@ -33,11 +34,6 @@ const std::vector<Command> kShareCommands = {
 
 void AddShareTo(CLI::App &app, const char *label, std::string &share, const char *description) {
     app.add_option(label, share, description)->required()->check(CheckName);
-}
-
-void AddShareOptionsTo(CLI::App &app, ShareOptions &options) {
-    AddShareTo(app, "SHARE", options.share, "Name of the share");
-    AddDryRunOption(app, options.isDryRun);
 }
 
 ExitCode SayNoShare(const std::string &share) {

@@ -1,9 +1,9 @@
 // pause, resume, clean: what needs a share that is there.
 
 #include <fileindex/index_mgr.h>
-#include <iostream>
 #include <memory>
 
+#include "change.h"
 #include "messages.h"
 #include "share/commands.h"
 #include "share_record.h"
@@ -38,29 +38,35 @@ Examples:
 // An operation on a share, and what is said about it.
 struct Operation {
     bool (*run)(const std::string &share);
-    const char *would; // "Would stop the work on share"
+    const char *would; // "stop the work on share"
     const char *attempt;
     const char *done;
     const char *next; // what to do then; may be empty
 };
 
-constexpr Operation kPause = {IndexMgr::SharePause, "Would stop the work on share",
+constexpr Operation kPause = {IndexMgr::SharePause, "stop the work on share",
                               "Cannot stop the work on share", "Stopped the work on share",
                               "fileindexctl share resume takes it up again."};
-constexpr Operation kResume = {IndexMgr::ShareResume, "Would take up the work on share",
+constexpr Operation kResume = {IndexMgr::ShareResume, "take up the work on share",
                                "Cannot take up the work on share", "Took up the work on share", ""};
-constexpr Operation kClean = {IndexMgr::CleanShareIndexData, "Would delete the index of share",
+constexpr Operation kClean = {IndexMgr::CleanShareIndexData, "delete the index of share",
                               "Cannot delete the index of share", "Deleted the index of share",
                               "fileindexctl reindex makes a new one for its folders."};
 
-ExitCode Run(const ShareOptions &options, const Operation &operation) {
+struct Options {
+    std::string share;
+    Change change;
+};
+
+ExitCode Run(Options &options, const Operation &operation) {
     const std::string name = OwnNameOf(options.share);
     if (name.empty()) {
         return SayNoShare(options.share);
     }
+    options.change.facts["shares"].append(name);
     const std::string share = " " + Shown(name);
-    if (options.isDryRun) {
-        std::cout << operation.would + share + ".\n";
+    if (options.change.isDryRun) {
+        options.change.Would(operation.would + share);
         return kDone;
     }
     if (!While("Telling the indexing service", [&] { return operation.run(name); })) {
@@ -74,10 +80,11 @@ ExitCode Run(const ShareOptions &options, const Operation &operation) {
 }
 
 Action Declare(CLI::App &app, const Operation &operation, const char *footer) {
-    const auto options = std::make_shared<ShareOptions>();
-    AddShareOptionsTo(app, *options);
+    const auto options = std::make_shared<Options>();
+    AddShareTo(app, "SHARE", options->share, "Name of the share");
     app.footer(footer);
-    return [options, &operation] { return Run(*options, operation); };
+    return MakeChange(app, options->change,
+                      [options, &operation] { return Run(*options, operation); });
 }
 
 } // namespace

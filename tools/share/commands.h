@@ -21,13 +21,6 @@ Action DeclareShareNeedReindex(CLI::App &app);
 // A required positional argument that names a share, as names stand in paths.
 void AddShareTo(CLI::App &app, const char *label, std::string &share, const char *description);
 
-// What most of them take.
-struct ShareOptions {
-    std::string share;
-    bool isDryRun = false;
-};
-void AddShareOptionsTo(CLI::App &app, ShareOptions &options);
-
 // Answers that there is no such share.
 ExitCode SayNoShare(const std::string &share);
 
