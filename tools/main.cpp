@@ -37,8 +37,9 @@ constexpr char kFooter[] =
 system. It is a share path when its first part names a share, else a full path
 when it lies in a share, else a share path whose share is gone.
 
-Exit status: 0 done, 1 failed, 2 mistake in the call, 3 not indexed or nothing
-of that name.
+Exit status: 0 done, 1 failed, 2 mistake in the call, 3 not indexed, not marked,
+or nothing of that name. Of status: 0 running, 3 paused or not running, 4 that
+could not be told, or no such folder.
 
 Examples:
   fileindexctl add /photos --photo --video

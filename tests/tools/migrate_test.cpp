@@ -6,12 +6,32 @@ namespace VANO::TESTS {
 namespace {
 
 using ::testing::HasSubstr;
+using ::testing::SizeIs;
 
 TEST_F(CtlTest, MigrateWithoutFoldersStopsTheDaemon) {
     EXPECT_EQ(Ctl({"migrate", "--dry-run"}).out, "Would stop fileindexd: no folder is indexed.\n");
     const Outcome outcome = Ctl({"migrate"});
     EXPECT_EQ(outcome.status, kDone);
     EXPECT_EQ(outcome.error, "fileindexctl: fileindexd is stopped: no folder is indexed.\n");
+}
+
+TEST_F(CtlTest, MigrateQueuesEveryFolder) {
+    constexpr char kSamba[] = "/etc/samba/smb.conf";
+    if (!Exists("/usr/bin/testparm") || !Exists("/usr/bin/net")) {
+        GTEST_SKIP() << "no Samba: Spotlight cannot be switched on";
+    }
+    Save(kTwo);
+    PutFile(kSamba, "[global]\nspotlight = yes\n");
+    const Outcome outcome = Ctl({"migrate", "--json"});
+    RemoveTree(kSamba);
+    EXPECT_EQ(outcome.status, kDone);
+    EXPECT_EQ(outcome.out, R"({"command":"migrate","done":true,"dry_run":false,)"
+                           R"("paths":["/media/films","/photos"]})"
+                           "\n");
+    EXPECT_EQ(outcome.error, "fileindexctl: The services follow the settings, and every folder is "
+                             "queued for a new index.\n");
+    EXPECT_THAT(ReadText(kPhotoQueue), HasSubstr(R"("event":65536,"path":"/volume1/photos")"));
+    EXPECT_THAT(NamesIn(kMonitors), SizeIs(2));
 }
 
 TEST_F(CtlTest, MigrateDryRunTellsAndDoesNothing) {
