@@ -309,6 +309,13 @@ TEST_F(StatusWatchTest, StatusShowsNamesThatCannotPlayTricks) {
     EXPECT_EQ(Json(Ctl({"status", "--json"}).out)["folder"][0]["path"], name);
 }
 
+TEST_F(StatusWatchTest, StatusAndWatchMakeNothingInTheShares) {
+    EXPECT_EQ(Ctl({"status"}).status, kPaused);
+    EXPECT_EQ(Ctl({"watch", "--count", "1"}).status, kDone);
+    EXPECT_THAT(NamesIn("/volume1/photos"), ElementsAre("2016"));
+    EXPECT_THAT(NamesIn("/volume2/media"), ElementsAre("films"));
+}
+
 // --- mistakes in the call -----------------------------------------------------------------------
 
 TEST_F(StatusWatchTest, MistakesAreNamed) {

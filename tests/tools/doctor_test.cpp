@@ -765,13 +765,25 @@ TEST_F(DoctorTest, WhileIndexingIsPausedAnOldQueueIsNoProblem) {
     EXPECT_THAT(Problems("queues"), SizeIs(1));
 }
 
-TEST_F(DoctorTest, WhatIsNoQueueIsNotOpened) {
+TEST_F(DoctorTest, WhatIsNoQueueIsNamed) {
     MakeDirs("/volume1/photos/@eaDir");
     ASSERT_EQ(::mkfifo(kPhotoQueue.c_str(), 0644), 0);
     EXPECT_THAT(ProblemOf("queues"), IsMendable("error", "queue-kind"));
     RemoveTree(kPhotoQueue);
     ASSERT_EQ(::symlink("/etc/passwd", kPhotoQueue.c_str()), 0);
     EXPECT_THAT(ProblemOf("queues")["what"].asString(), HasSubstr("is a symbolic link"));
+}
+
+// Users can put a link there; where it leads is nobody's business.
+TEST_F(DoctorTest, ALinkInThePlaceOfTheQueuesDirectoryIsNotFollowed) {
+    const std::string secret = "/tmp/secret/VANO@file_index_queue";
+    PutFile(secret, "no event\n");
+    ASSERT_EQ(::symlink("/tmp/secret", "/volume1/photos/@eaDir"), 0);
+    const Json::Value problem = ProblemOf("queues");
+    EXPECT_THAT(problem, IsMendable("error", "queue-kind"));
+    EXPECT_EQ(problem["what"].asString(), "/volume1/photos/@eaDir is a symbolic link");
+    const HoldLock lock(secret);
+    EXPECT_THAT(Problems("locks"), IsEmpty());
 }
 
 // --- monitor ------------------------------------------------------------------------------------

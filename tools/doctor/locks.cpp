@@ -12,10 +12,10 @@
 #include <thread>
 #include <unistd.h>
 
-#include "base/unique_fd.h"
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
 #include "doctor/process.h"
+#include "status/queue_file.h"
 #include "text.h"
 
 namespace CTL::DOCTOR {
@@ -36,8 +36,7 @@ std::string Numbers(unsigned major, unsigned minor) {
 
 // The device of the file's mount, as the kernel's list of locks has it. Some file systems give
 // stat() another number.
-std::string MountDeviceOf(const std::string &path) {
-    const UniqueFd file(::open(path.c_str(), O_PATH | O_NOFOLLOW | O_CLOEXEC));
+std::string MountDeviceOf(const UniqueFd &file) {
     std::ifstream facts("/proc/self/fdinfo/" + std::to_string(file.Get()));
     std::string key;
     std::string mount;
@@ -62,9 +61,9 @@ std::string MountDeviceOf(const std::string &path) {
 }
 
 // How the list names a file: "08:01:1234". Both forms, where they differ.
-std::vector<std::string> ListNamesOf(const std::string &path, const struct stat &info) {
+std::vector<std::string> ListNamesOf(const UniqueFd &file, const struct stat &info) {
     const std::string inode = ":" + std::to_string(info.st_ino);
-    return {Numbers(major(info.st_dev), minor(info.st_dev)) + inode, MountDeviceOf(path) + inode};
+    return {Numbers(major(info.st_dev), minor(info.st_dev)) + inode, MountDeviceOf(file) + inode};
 }
 
 // Who holds each locked file of the system, by its name in the list.
@@ -157,14 +156,25 @@ bool IsSettingsLock(const std::string &path) {
     return path == kFolderLock || path == kStatusLock;
 }
 
-std::vector<std::string> LockPaths(const Machine &machine) {
-    std::vector<std::string> paths = {kFolderLock, kStatusLock};
+// Adds the file if it can be locked.
+void Add(std::vector<LockFile> &files, const std::string &path, const UniqueFd &file) {
+    struct stat info {};
+    if (file && ::fstat(file.Get(), &info) == 0 && S_ISREG(info.st_mode)) {
+        files.push_back({path, ListNamesOf(file, info)});
+    }
+}
+
+std::vector<LockFile> LockFilesOf(const Machine &machine) {
+    std::vector<LockFile> files;
+    for (const char *path : {kFolderLock, kStatusLock}) {
+        Add(files, path, UniqueFd(::open(path, O_PATH | O_NOFOLLOW | O_CLOEXEC)));
+    }
     for (const KnownShare &share : machine.shares) {
         if (!share.directory.empty()) {
-            paths.push_back(share.Queue()); // its own lock
+            Add(files, share.Queue(), OpenQueue(share.Queue(), O_PATH)); // its own lock
         }
     }
-    return paths;
+    return files;
 }
 
 Finding Held(const LockFile &file) {
@@ -188,16 +198,13 @@ Finding Held(const LockFile &file) {
 
 Findings CheckLocks(const Machine &machine) {
     Findings findings;
-    std::vector<LockFile> files;
-    for (const std::string &path : LockPaths(machine)) {
+    for (const char *path : {kFolderLock, kStatusLock}) {
         const FileLook look(path);
-        if (look.Exists() && IsSettingsLock(path)) {
+        if (look.Exists()) {
             LookAtLockFile(findings, path, look.info);
         }
-        if (look.IsRegular()) {
-            files.push_back({path, ListNamesOf(path, look.info)});
-        }
     }
+    std::vector<LockFile> files = LockFilesOf(machine);
     LookUntilFree(files);
     for (const LockFile &file : files) {
         findings.push_back(Held(file));

@@ -3,6 +3,8 @@
 #include <fileindex/index_mgr.h>
 #include <utility>
 
+#include "status/queue_file.h"
+
 namespace CTL::DOCTOR {
 
 namespace {
@@ -12,7 +14,7 @@ constexpr std::size_t kMostNamed = 10; // on one command line
 } // namespace
 
 std::string KnownShare::Queue() const {
-    return directory + "/@eaDir/VANO@file_index_queue";
+    return QueueIn(directory);
 }
 
 std::string KnownShare::ReindexCommand() const {

@@ -17,11 +17,9 @@ constexpr char kFolderLock[] = "/tmp/fileidx_cfg_folder.lock";
 constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
 constexpr char kMonitorDirectory[] = "/usr/vano/etc/vanotifyd";
 constexpr char kDaemonSocket[] = "/var/run/fileindexd.sock";
-constexpr char kTakenQueueSuffix[] = ".tmp";
 
 // A share of the table, or one that a folder names.
 struct KnownShare : Share {
-    // Asking the library for it would make the directory above it.
     [[nodiscard]] std::string Queue() const;
 
     // The command line that has its folders indexed anew.

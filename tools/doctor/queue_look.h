@@ -2,7 +2,8 @@
 #define FILEINDEXCTL_DOCTOR_QUEUE_LOOK_H
 
 #include <cstddef>
-#include <string>
+
+#include "status/queue_file.h"
 
 namespace CTL::DOCTOR {
 
@@ -18,8 +19,8 @@ struct QueueLook {
     bool isWhole = true;       // false when no more than kMostQueueBytes were read
 };
 
-// Takes no lock: a line that is being written can be taken for a malformed one.
-[[nodiscard]] QueueLook LookAtQueue(const std::string &path);
+// A file that is open. A line that is being written can be taken for a malformed one.
+[[nodiscard]] QueueLook LookInto(const QueueFile &queue);
 
 } // namespace CTL::DOCTOR
 

@@ -1,7 +1,8 @@
 // The queue of each share, and the one beside it that the daemon took over.
 
-#include <cerrno>
 #include <ctime>
+#include <fcntl.h>
+#include <sys/stat.h>
 
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
@@ -16,8 +17,16 @@ namespace {
 // A daemon that keeps up takes a queue over within seconds, and works through it within a day even
 // where a whole share is indexed anew.
 constexpr std::size_t kMostEvents = 100000;
-constexpr long long kLongestWait = 3600;
-constexpr long long kLongestWork = 24LL * 3600;
+
+struct Patience {
+    long long seconds;
+    const char *atAnEnd; // why it matters
+};
+
+constexpr Patience kBeforeItIsTaken = {3600,
+                                       "The daemon does not take the queue over (within an hour)."};
+constexpr Patience kOnceItIsTaken = {
+    24LL * 3600, "The daemon took this queue over and does not come to its end (within a day)."};
 
 // What the daemon can be expected to have done by now.
 bool MayWait(const Machine &machine) {
@@ -63,69 +72,77 @@ void JudgeSize(Findings &findings, const QueueLook &look, const std::string &pat
     }
 }
 
-void JudgeAge(Findings &findings, const QueueLook &look, const std::string &path, bool isTaken) {
-    if (look.age > (isTaken ? kLongestWork : kLongestWait)) {
+void JudgeAge(Findings &findings, const QueueLook &look, const std::string &path,
+              const Patience &patience) {
+    if (look.age > patience.seconds) {
         findings.push_back(WithCounts(
             Warning("queue-old", path,
                     Shown(path) + ": the oldest event has waited for " + Duration(look.age))
-                .Because(isTaken ? "The daemon took this queue over and does not come to its end "
-                                   "(within a day)."
-                                 : "The daemon does not take the queue over (within an hour).")
+                .Because(patience.atAnEnd)
                 .Mend("Look whether it runs and what it logs.", "fileindexctl doctor daemon"),
             look));
     }
 }
 
-// Whether a queue can be looked into. What keeps it from that is found; a missing one is empty.
-bool IsQueue(Findings &findings, const std::string &path) {
-    const FileLook look(path);
-    if (look.error == ENOENT) {
-        return false;
+Finding WrongKind(const std::string &path, mode_t mode) {
+    return Error("queue-kind", path, Shown(path) + " is " + KindOf(mode))
+        .Because("No event can be queued there.")
+        .Mend("Move it out of the way.", "mv " + Quoted(path) + " " + Quoted(path + ".odd"));
+}
+
+// Whether the queues can be looked for in the directory that should hold them.
+bool MayHoldQueues(Findings &findings, const std::string &directory) {
+    const FileLook look(directory);
+    const bool isInTheWay = look.Exists() && !S_ISDIR(look.info.st_mode);
+    if (isInTheWay) {
+        findings.push_back(WrongKind(directory, look.info.st_mode));
     }
-    if (!look.Exists()) {
-        findings.push_back(Unreadable("queue-unreadable", path, look.error));
-        return false;
+    return !isInTheWay;
+}
+
+// Why a queue could not be opened.
+Finding Obstacle(const std::string &path, int error) {
+    struct stat info {};
+    const VANO::FILEINDEX::UniqueFd place = OpenQueue(path, O_PATH);
+    const bool isKnown = place && ::fstat(place.Get(), &info) == 0;
+    return isKnown && !S_ISREG(info.st_mode) ? WrongKind(path, info.st_mode)
+                                             : Unreadable("queue-unreadable", path, error);
+}
+
+// A missing queue is empty: there is nothing to be said of it.
+void LookAtQueue(Findings &findings, const Machine &machine, const KnownShare &share,
+                 const std::string &path, const Patience &patience) {
+    const QueueFile queue(path);
+    const QueueLook look = queue.IsOpen() ? LookInto(queue) : QueueLook{queue.Error()};
+    if (look.error != 0) {
+        findings.push_back(Obstacle(path, look.error));
+        return;
     }
-    if (!look.IsRegular()) {
+    if (!queue.IsOpen()) {
+        return;
+    }
+    const std::size_t before = findings.size();
+    JudgeContent(findings, look, path, share);
+    JudgeSize(findings, look, path);
+    if (!MayWait(machine)) {
+        JudgeAge(findings, look, path, patience);
+    }
+    if (findings.size() == before) {
         findings.push_back(
-            Error("queue-kind", path, Shown(path) + " is " + KindOf(look.info.st_mode))
-                .Because("No event can be queued there.")
-                .Mend("Move it out of the way.",
-                      "mv " + Quoted(path) + " " + Quoted(path + ".odd")));
-        return false;
+            WithCounts(Ok("queue-good", path, Shown(path) + ": " + EventsOf(look)), look));
     }
-    return true;
 }
 
 } // namespace
 
 Findings CheckQueues(const Machine &machine) {
     Findings findings;
-    const bool mayWait = MayWait(machine);
-    const auto lookAt = [&](const KnownShare &share, const std::string &path, bool isTaken) {
-        if (!IsQueue(findings, path)) {
-            return;
-        }
-        const QueueLook look = LookAtQueue(path);
-        if (look.error != 0) {
-            findings.push_back(Unreadable("queue-unreadable", path, look.error));
-            return;
-        }
-        const std::size_t before = findings.size();
-        JudgeContent(findings, look, path, share);
-        JudgeSize(findings, look, path);
-        if (!mayWait) {
-            JudgeAge(findings, look, path, isTaken);
-        }
-        if (findings.size() == before) {
-            findings.push_back(
-                WithCounts(Ok("queue-good", path, Shown(path) + ": " + EventsOf(look)), look));
-        }
-    };
     for (const KnownShare &share : machine.shares) {
-        if (!share.directory.empty() && DirectoryError(share.directory) == 0) {
-            lookAt(share, share.Queue(), false);
-            lookAt(share, share.Queue() + kTakenQueueSuffix, true);
+        const std::string queue = share.Queue();
+        if (!share.directory.empty() && DirectoryError(share.directory) == 0 &&
+            MayHoldQueues(findings, queue.substr(0, queue.rfind('/')))) {
+            LookAtQueue(findings, machine, share, queue, kBeforeItIsTaken);
+            LookAtQueue(findings, machine, share, queue + kTakenSuffix, kOnceItIsTaken);
         }
     }
     if (findings.empty()) {

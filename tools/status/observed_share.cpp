@@ -1,27 +1,14 @@
 #include "status/observed_share.h"
 
 #include <algorithm>
-#include <array>
-#include <climits>
-#include <fileindex/fileindex.h>
 #include <fileindex/index_rules.h>
 #include <fileindex/status_mgr.h>
 
+#include "share_record.h"
+
 namespace CTL {
 
-namespace {
-
 namespace fileindex = VANO::FILEINDEX;
-
-std::string QueueOf(const std::string &share) {
-    std::array<char, PATH_MAX> queue{};
-    const int length =
-        FILEIDXQueuePathGet(share.c_str(), queue.data(), static_cast<int>(queue.size()));
-    // A path that fills the buffer was cut: it names something else.
-    return length < 0 || length >= static_cast<int>(queue.size()) - 1 ? "" : queue.data();
-}
-
-} // namespace
 
 void ObservedShare::Add(const fileindex::Folder &folder) {
     folders_.push_back(folder);
@@ -32,13 +19,11 @@ void ObservedShare::Add(const fileindex::Folder &folder) {
 void ObservedShare::Prepare(std::vector<ObservedShare> &former) {
     isOutOfSpace_ = fileindex::StatusMgr::ShareIsNoSpace(name_);
     needsReindex_ = fileindex::StatusMgr::ShareIsNeedReindex(name_);
-    // Where no folder has a full path the share is gone, and asking would only be logged.
-    const bool isThere = std::any_of(fullPaths_.begin(), fullPaths_.end(),
-                                     [](const std::string &path) { return !path.empty(); });
-    queue_ = isThere ? QueueOf(name_) : "";
-    if (queue_.empty()) {
+    const std::string directory = DirectoryOfShare(name_);
+    if (directory.empty()) {
         return;
     }
+    queue_ = QueueIn(directory);
     for (ObservedShare &other : former) {
         if (other.counter_ && other.queue_ == queue_ && other.fullPaths_ == fullPaths_) {
             counter_ = std::move(other.counter_);

@@ -1,57 +1,18 @@
 #include "status/queue_counter.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <fcntl.h>
 #include <string_view>
-#include <sys/stat.h>
-#include <unistd.h>
 
 namespace CTL {
 
 namespace {
 
-constexpr char kTakenSuffix[] = ".tmp";
 constexpr std::size_t kChunkBytes = std::size_t{64} * 1024;
 constexpr std::size_t kRememberedBytes = 256;
 // A longer line is no event: the library, too, cuts it there.
 constexpr std::size_t kMaxLineBytes = VANO::FILEINDEX::kMaxJsonFileBytes;
 
-// Users can write where queues are: neither the directory nor the file may be a symbolic link.
-VANO::FILEINDEX::UniqueFd OpenInDirectory(const std::string &path) {
-    constexpr int kDirectory = O_PATH | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
-    constexpr int kFile = O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
-    const std::size_t slash = path.rfind('/');
-    const VANO::FILEINDEX::UniqueFd directory(::open(path.substr(0, slash).c_str(), kDirectory));
-    return VANO::FILEINDEX::UniqueFd(
-        directory ? ::openat(directory.Get(), path.c_str() + slash + 1, kFile) : -1);
-}
-
 } // namespace
-
-QueueFile::QueueFile(const std::string &path) : fd_(OpenInDirectory(path)) {
-    struct stat info {};
-    if (!fd_ || ::fstat(fd_.Get(), &info) != 0) {
-        error_ = errno == ENOENT ? 0 : errno;
-        fd_ = VANO::FILEINDEX::UniqueFd();
-    } else if (!S_ISREG(info.st_mode)) {
-        error_ = EINVAL;
-        fd_ = VANO::FILEINDEX::UniqueFd();
-    } else {
-        identity_ = {info.st_dev, info.st_ino};
-        size_ = info.st_size;
-    }
-}
-
-std::string QueueFile::ReadAt(off_t offset, std::size_t bytes) const {
-    std::string text(bytes, '\0');
-    ssize_t got = 0;
-    do {
-        got = ::pread(fd_.Get(), text.data(), bytes, offset);
-    } while (got < 0 && errno == EINTR);
-    text.resize(got > 0 ? static_cast<std::size_t>(got) : 0);
-    return text;
-}
 
 bool FileCount::IsOf(const QueueFile &file) const {
     return file.IsOpen() && offset_ > 0 && identity_ == file.WhichFile();

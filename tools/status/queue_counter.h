@@ -5,12 +5,10 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
-#include <sys/types.h>
-#include <utility>
 #include <vector>
 
-#include "base/unique_fd.h"
 #include "status/event_tally.h"
+#include "status/queue_file.h"
 
 // Counting what waits in a queue again and again, without reading again what has been counted.
 // Nothing is locked and nothing stays open, so writers, the daemon and an unmount see nothing of
@@ -19,31 +17,6 @@
 namespace CTL {
 
 using Clock = std::chrono::steady_clock;
-
-// A queue file, opened to be looked at, by its absolute path. A symbolic link in its place or its
-// directory's is not followed, and anything but a regular file refused.
-class QueueFile {
-  public:
-    QueueFile() = default; // nothing is there
-    explicit QueueFile(const std::string &path);
-
-    [[nodiscard]] bool IsOpen() const { return static_cast<bool>(fd_); }
-    // Why it is not open; 0 when nothing is there, which is an empty queue.
-    [[nodiscard]] int Error() const { return error_; }
-
-    using Identity = std::pair<dev_t, ino_t>;
-    [[nodiscard]] Identity WhichFile() const { return identity_; }
-
-    [[nodiscard]] off_t Size() const { return size_; }
-    // At most `bytes` bytes from `offset` on; fewer at the end of the file or at a read error.
-    [[nodiscard]] std::string ReadAt(off_t offset, std::size_t bytes) const;
-
-  private:
-    VANO::FILEINDEX::UniqueFd fd_;
-    int error_ = 0;
-    Identity identity_{};
-    off_t size_ = 0;
-};
 
 // How far one file has been counted, and what was found.
 class FileCount {
