@@ -10,6 +10,7 @@
 #include "paths.h"
 #include "query_reason.h"
 #include "shares.h"
+#include "terminal.h"
 #include "text.h"
 
 namespace CTL {
@@ -79,9 +80,7 @@ void PrintWithReasons(const std::vector<std::string> &asked, const std::vector<A
     for (std::size_t i = 0; i < asked.size(); ++i) {
         std::cout << Word(answers[i]) << "  " << Shown(asked[i]) << '\n';
         for (const std::string &line : answers[i].reason.lines) {
-            const std::string text = "  " + line;
-            std::cout << (IsTerminal() ? Wrapped(text, TerminalColumns(STDOUT_FILENO), 4) : text)
-                      << '\n';
+            std::cout << Wrapped("  " + line, LineWidth(STDOUT_FILENO), 4) << '\n';
         }
     }
 }

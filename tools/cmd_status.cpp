@@ -1,5 +1,6 @@
 #include <iostream>
 #include <memory>
+#include <unistd.h>
 
 #include "colour.h"
 #include "command.h"
@@ -8,6 +9,7 @@
 #include "output.h"
 #include "paths.h"
 #include "status/observer.h"
+#include "terminal.h"
 
 namespace CTL {
 
@@ -67,7 +69,7 @@ ExitCode Run(const Options &options) {
         return kUnknown;
     }
     if (!observer.Look(Clock::now() + kPatience)) {
-        if (IsTerminal()) {
+        if (IsTerminal(STDOUT_FILENO)) {
             Say("Counting what waits. The queues are long.");
         }
         (void)observer.Look(Clock::time_point::max());

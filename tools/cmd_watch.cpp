@@ -1,8 +1,7 @@
 #include <csignal>
-#include <cstdlib>
 #include <map>
 #include <memory>
-#include <string_view>
+#include <unistd.h>
 
 #include "command.h"
 #include "fit.h"
@@ -10,6 +9,7 @@
 #include "output.h"
 #include "paths.h"
 #include "status/observer.h"
+#include "terminal.h"
 #include "watch/line_output.h"
 #include "watch/live_output.h"
 #include "watch/signals.h"
@@ -47,8 +47,7 @@ std::unique_ptr<WatchOutput> OutputFor(const Options &options) {
     if (options.json != JsonMode::kOff) {
         return std::make_unique<JsonOutput>();
     }
-    const char *terminal = std::getenv("TERM");
-    if (IsTerminal() && terminal != nullptr && std::string_view(terminal) != "dumb") {
+    if (IsTerminal(STDOUT_FILENO) && KnowsEscapeCodes()) {
         return std::make_unique<LiveOutput>(StyleOfOutput());
     }
     return std::make_unique<LineOutput>();

@@ -7,7 +7,7 @@
 #include <langinfo.h>
 #include <vector>
 
-#include "output.h"
+#include "terminal.h"
 #include "text.h"
 
 namespace CTL {

@@ -3,20 +3,18 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstdio>
-#include <cstdlib>
 #include <fcntl.h>
 #include <fileindex/error_handler.h>
 #include <fileindex/folders.h>
 #include <fileindex/status.h>
 #include <iostream>
-#include <string_view>
 #include <sys/stat.h>
 #include <system_error>
 #include <unistd.h>
 #include <vano_platform.h>
 
 #include "base/unique_fd.h"
-#include "output.h"
+#include "terminal.h"
 #include "text.h"
 
 namespace CTL {
@@ -115,25 +113,18 @@ bool NeedsRoot(fileindex::_tag_fileindex_err_ code) {
     }
 }
 
-// A person gets lines that fit, a program one line.
-std::string ForReader(const std::string &message) {
-    return ::isatty(STDERR_FILENO) == 1 ? Wrapped(message, TerminalColumns(STDERR_FILENO), 2)
-                                        : message;
-}
-
-bool CanErase() {
-    const char *terminal = std::getenv("TERM");
-    return terminal != nullptr && std::string_view(terminal) != "dumb";
+void PrintMessage(const std::string &message) {
+    std::cerr << Wrapped(message, LineWidth(STDERR_FILENO), 2) << '\n';
 }
 
 } // namespace
 
 void Say(const std::string &message) {
-    std::cerr << ForReader("fileindexctl: " + message) << '\n';
+    PrintMessage("fileindexctl: " + message);
 }
 
 void Advise(const std::string &advice) {
-    std::cerr << ForReader("  " + advice) << '\n';
+    PrintMessage("  " + advice);
 }
 
 ExitCode Fail(const std::string &what) {
@@ -160,7 +151,8 @@ void ForgetErrors() {
     VLIBCErrSetEx(0, "", 0);
 }
 
-Working::Working(const std::string &what) : isShown_(::isatty(STDERR_FILENO) == 1 && CanErase()) {
+Working::Working(const std::string &what)
+    : isShown_(IsTerminal(STDERR_FILENO) && KnowsEscapeCodes()) {
     if (isShown_) {
         std::cerr << what << " ..." << std::flush;
     }

@@ -1,13 +1,12 @@
 #include "output.h"
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
-#include <cstdlib>
 #include <iostream>
 #include <json/writer.h>
-#include <string_view>
-#include <sys/ioctl.h>
 #include <unistd.h>
 
+#include "terminal.h"
 #include "text.h"
 
 namespace CTL {
@@ -49,29 +48,14 @@ void PrintRow(const std::vector<std::string> &cells, const std::vector<std::size
 
 } // namespace
 
-bool IsTerminal() {
-    return ::isatty(STDOUT_FILENO) == 1;
-}
-
-std::size_t TerminalColumns(int fd) {
-    struct winsize size {};
-    return ::ioctl(fd, TIOCGWINSZ, &size) == 0 && size.ws_col > 0 ? size.ws_col : 80;
-}
-
-bool MayUseColour() {
-    const char *none = std::getenv("NO_COLOR");
-    const char *terminal = std::getenv("TERM");
-    return IsTerminal() && (none == nullptr || *none == '\0') && terminal != nullptr &&
-           std::string_view(terminal) != "dumb";
-}
-
 void AddJsonOption(CLI::App &app, JsonMode &mode) {
     // A flag, so that the word after a plain --json is not taken for its value.
     CLI::Option *json =
         app.add_flag("--json{short}", mode, "Answer in JSON: on one line (short), indented or not");
     json->transform(JsonModeNumber)->type_name("short|pretty|off");
     app.add_flag_callback(
-           "-j", [&mode] { mode = IsTerminal() ? JsonMode::kPretty : JsonMode::kShort; },
+           "-j",
+           [&mode] { mode = IsTerminal(STDOUT_FILENO) ? JsonMode::kPretty : JsonMode::kShort; },
            "Answer in JSON: pretty on a terminal, short elsewhere")
         ->excludes(json);
 }
@@ -97,7 +81,7 @@ void Table::Add(const std::vector<std::string> &cells) {
 }
 
 void Table::Print() const {
-    const bool hasHeadings = IsTerminal();
+    const bool hasHeadings = IsTerminal(STDOUT_FILENO);
     std::vector<std::size_t> widths;
     for (std::size_t column = 0; column < headings_.size(); ++column) {
         std::size_t width = hasHeadings ? Columns(headings_[column]) : 0;

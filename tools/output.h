@@ -1,20 +1,17 @@
 #ifndef FILEINDEXCTL_OUTPUT_H
 #define FILEINDEXCTL_OUTPUT_H
 
-#include <CLI/CLI.hpp>
-#include <cstddef>
 #include <json/value.h>
 #include <string>
 #include <vector>
 
+namespace CLI {
+class App;
+}
+
 // Standard output: where the answers go.
 
 namespace CTL {
-
-[[nodiscard]] bool IsTerminal();
-// How wide the terminal behind a descriptor is; 80 where that cannot be told.
-[[nodiscard]] std::size_t TerminalColumns(int fd);
-[[nodiscard]] bool MayUseColour(); // a terminal that knows colours, and nobody who asked for none
 
 enum class JsonMode { kOff, kShort, kPretty };
 

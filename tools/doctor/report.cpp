@@ -2,97 +2,60 @@
 
 #include <algorithm>
 #include <iostream>
-#include <sstream>
-#include <sys/ioctl.h>
 #include <unistd.h>
 
-#include "output.h"
+#include "colour.h"
+#include "terminal.h"
 #include "text.h"
 
 namespace CTL::DOCTOR {
 
 namespace {
 
-constexpr std::size_t kUsualColumns = 80;
-constexpr std::size_t kFewestColumns = 40;
 constexpr std::size_t kIndent = 11; // "  warning  "
 constexpr std::size_t kCommandIndent = kIndent + 2;
 
 struct Mark {
     const char *word;
-    const char *colour;
+    Colour colour;
 };
 
 Mark MarkOf(Severity severity) {
     switch (severity) {
     case Severity::kOk:
-        return {"ok", "\033[32m"};
+        return {"ok", Colour::kGood};
     case Severity::kUnknown:
-        return {"unknown", "\033[36m"};
+        return {"unknown", Colour::kPlain};
     case Severity::kWarning:
-        return {"warning", "\033[33m"};
+        return {"warning", Colour::kBold};
     case Severity::kError:
         break;
     }
-    return {"error", "\033[1;31m"};
-}
-
-std::string Coloured(const std::string &text, const char *colour) {
-    return MayUseColour() ? colour + text + "\033[0m" : text;
-}
-
-// 0 for lines of any length.
-std::size_t ScreenColumns() {
-    if (!IsTerminal()) {
-        return 0;
-    }
-    winsize size{};
-    const bool isKnown = ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 0;
-    return isKnown ? std::max<std::size_t>(size.ws_col, kFewestColumns) : kUsualColumns;
-}
-
-// Words on as few lines as they need, each further line indented. The first is begun already, at
-// the same column.
-void PrintWords(const std::string &text) {
-    const std::size_t screen = ScreenColumns();
-    std::istringstream words(text);
-    std::size_t column = kIndent;
-    bool isFirst = true;
-    for (std::string word; words >> word; isFirst = false) {
-        const std::size_t width = Columns(word);
-        if (!isFirst && screen > 0 && column + 1 + width > screen) {
-            std::cout << '\n' << std::string(kIndent, ' ');
-            column = kIndent;
-        } else if (!isFirst) {
-            std::cout << ' ';
-            ++column;
-        }
-        std::cout << word;
-        column += width;
-    }
-    std::cout << '\n';
+    return {"error", Colour::kBad};
 }
 
 void PrintParagraph(const std::string &text) {
     if (!text.empty()) {
-        std::cout << std::string(kIndent, ' ');
-        PrintWords(text);
+        std::cout << Wrapped(std::string(kIndent, ' ') + text, LineWidth(STDOUT_FILENO), kIndent)
+                  << '\n';
     }
 }
 
 void PrintFinding(const Finding &finding) {
     const Mark mark = MarkOf(finding.severity);
     const std::string word = Padded(mark.word, kIndent - 4);
-    std::cout << "  " << Coloured(word, mark.colour) << "  ";
-    PrintWords(finding.what);
+    const std::string text =
+        Wrapped("  " + word + "  " + finding.what, LineWidth(STDOUT_FILENO), kIndent);
+    std::cout << "  " << Coloured(word, mark.colour, MayUseColour()) << text.substr(2 + word.size())
+              << '\n';
     PrintParagraph(finding.why);
     for (const std::string &line : finding.quote) {
         std::cout << std::string(kCommandIndent, ' ') << line << '\n';
     }
     PrintParagraph(finding.mend);
     if (!finding.command.empty()) {
-        std::cout << std::string(kCommandIndent, ' ') << Coloured(finding.command, "\033[1m")
-                  << '\n';
+        std::cout << std::string(kCommandIndent, ' ')
+                  << Coloured(finding.command, Colour::kBold, MayUseColour()) << '\n';
     }
 }
 
@@ -163,7 +126,7 @@ void PrintReport(const Report &report, bool onlyProblems) {
             continue;
         }
         isAnyShown = true;
-        std::cout << Coloured(chapter.check->title, "\033[1m") << '\n';
+        std::cout << Coloured(chapter.check->title, Colour::kBold, MayUseColour()) << '\n';
         for (const Finding &finding : chapter.findings) {
             if (IsShown(finding, onlyProblems)) {
                 PrintFinding(finding);

@@ -7,7 +7,6 @@
 #include <poll.h>
 #include <string>
 #include <string_view>
-#include <sys/ioctl.h>
 #include <unistd.h>
 
 namespace CTL {
@@ -34,16 +33,6 @@ bool Write(std::string_view text) {
     return true;
 }
 
-// What a terminal that does not know its size is drawn for.
-ScreenSize SizeOfTerminal() {
-    winsize window{};
-    if (::ioctl(STDOUT_FILENO, TIOCGWINSZ, &window) != 0 || window.ws_row == 0 ||
-        window.ws_col == 0) {
-        return {};
-    }
-    return {window.ws_row, window.ws_col};
-}
-
 bool IsForeground() {
     return ::isatty(STDIN_FILENO) == 1 && ::tcgetpgrp(STDIN_FILENO) == ::getpgrp();
 }
@@ -58,7 +47,7 @@ std::string FooterOf(const ServiceState &service) {
 
 LiveOutput::~LiveOutput() {
     if (isEntered_ && Leave()) {
-        ScreenSize size = SizeOfTerminal();
+        ScreenSize size = SizeOfTerminal(STDOUT_FILENO);
         size.rows = std::string::npos / 2;
         for (const std::string &line : FrameOf(state_, size, style_)) {
             (void)Write(line + "\n"); // nobody is left to be told
@@ -113,7 +102,7 @@ bool LiveOutput::ReadsTheEnd() {
 }
 
 bool LiveOutput::Draw() const {
-    const ScreenSize size = SizeOfTerminal();
+    const ScreenSize size = SizeOfTerminal(STDOUT_FILENO);
     const std::size_t rows = size.rows > 2 ? size.rows - 2 : size.rows;
     std::vector<std::string> lines = FrameOf(state_, {rows, size.columns}, style_);
     if (rows < size.rows) {

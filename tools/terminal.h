@@ -1,0 +1,32 @@
+#ifndef FILEINDEXCTL_TERMINAL_H
+#define FILEINDEXCTL_TERMINAL_H
+
+#include <cstddef>
+
+// What stands behind a descriptor, and what it can show.
+
+namespace CTL {
+
+struct ScreenSize {
+    std::size_t rows = 24;
+    std::size_t columns = 80;
+};
+
+[[nodiscard]] bool IsTerminal(int fd);
+
+// Where the terminal does not know it, the usual one.
+[[nodiscard]] ScreenSize SizeOfTerminal(int fd);
+
+// How long a line may become: a person gets lines that fit the terminal, a program lines of any
+// length.
+[[nodiscard]] std::size_t LineWidth(int fd);
+
+// Whether terminals of this environment can do more than writing on.
+[[nodiscard]] bool KnowsEscapeCodes();
+
+// Whether standard output is a terminal that knows colours, and nobody has asked for none.
+[[nodiscard]] bool MayUseColour();
+
+} // namespace CTL
+
+#endif
