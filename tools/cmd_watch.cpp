@@ -1,3 +1,4 @@
+#include <algorithm>
 #include <csignal>
 #include <map>
 #include <memory>
@@ -19,9 +20,10 @@ namespace CTL {
 namespace {
 
 constexpr char kFooter[] =
-    R"(On a terminal one picture is drawn again and again, until Ctrl-C or q; elsewhere
-a line is written whenever something has changed. With --json there is one
-object a line, for each look, however it is to be laid out.
+    R"(On a terminal one picture is drawn again and again, until Ctrl-C or q, but none
+while it is in the background; elsewhere a line is written whenever something
+has changed. With --json there is one object a line, for each look, however it
+is to be laid out.
 
 Exit status: 0 when it was ended by Ctrl-C, q, SIGTERM or --count; 1 failed,
 2 mistake in the call, 3 no such folder.
@@ -35,6 +37,8 @@ constexpr double kShortestInterval = 0.1;
 constexpr double kLongestInterval = 3600;
 // Counting a long queue is interrupted so often to show how far it is, and to hear signals.
 constexpr std::chrono::milliseconds kSlice{100};
+// What no signal tells of is noticed after that long.
+constexpr std::chrono::seconds kSlumber{1};
 
 struct Options {
     std::vector<std::string> paths;
@@ -66,7 +70,6 @@ class Watch {
 
     ExitCode Run(const Options &options) {
         const std::chrono::duration<double> interval(options.interval);
-        isWritable_ = output_.Begin();
         for (unsigned long looks = 1; GoesOn(); ++looks) {
             const auto next = Clock::now() + std::chrono::ceil<Clock::duration>(interval);
             LookOnce();
@@ -74,7 +77,8 @@ class Watch {
                 break;
             }
             while (GoesOn() && Clock::now() < next) {
-                WaitUntil(next);
+                WaitUntil(std::min(next, Clock::now() + kSlumber));
+                isWritable_ = isWritable_ && output_.Attend();
             }
         }
         return isWritable_ ? kDone : kFailed;

@@ -35,4 +35,9 @@ bool MayUseColour() {
     return IsTerminal(STDOUT_FILENO) && KnowsEscapeCodes() && (none == nullptr || *none == '\0');
 }
 
+bool IsInForeground(int fd) {
+    const pid_t group = ::tcgetpgrp(fd);
+    return group < 0 || group == ::getpgrp(); // below 0 no shell shares it out
+}
+
 } // namespace CTL

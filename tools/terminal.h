@@ -27,6 +27,10 @@ struct ScreenSize {
 // Whether standard output is a terminal that knows colours, and nobody has asked for none.
 [[nodiscard]] bool MayUseColour();
 
+// Whether the terminal behind `fd` is this program's to draw on. A shell that has put it into the
+// background has the terminal for itself.
+[[nodiscard]] bool IsInForeground(int fd);
+
 } // namespace CTL
 
 #endif

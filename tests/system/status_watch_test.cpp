@@ -626,6 +626,37 @@ TEST_F(StatusWatchTest, WatchGivesTheTerminalBackWhileItIsSuspended) {
     EXPECT_EQ(child->Wait(), kDone);
 }
 
+// What a shell with jobs and its `watch` have written, from `position` on.
+bool Says(PtyChild &shell, const std::string &text, std::size_t position = 0) {
+    return Eventually([&] { return shell.Output().find(text, position) != std::string::npos; });
+}
+
+TEST_F(StatusWatchTest, WatchDrawsNothingInTheBackground) {
+    PtyChild shell({"/bin/sh", "-i"}, kPlainTerminal, 24, 80);
+    shell.Type(FILEINDEXCTL_PATH " watch --count 5 --interval 0.1 & wait; echo en''ded\n");
+    ASSERT_TRUE(Says(shell, "ended\r\n"));
+    EXPECT_THAT(shell.Output(),
+                AllOf(Not(HasSubstr(kEnter)), Not(HasSubstr(kLeave)), Not(HasSubstr("Daemon:"))));
+}
+
+TEST_F(StatusWatchTest, WatchLeavesTheScreenForTheBackgroundAndTakesItAgainInTheForeground) {
+    // A shell that sends a job no signal when it brings it to the foreground while it runs.
+    PtyChild shell({"/bin/bash", "--norc", "--noediting", "-i"}, kPlainTerminal, 24, 80);
+    shell.Type(FILEINDEXCTL_PATH " watch --interval 3600 & sleep 0.5; fg\n");
+    ASSERT_TRUE(Says(shell, "Ctrl-C ends.")); // without waiting for the next look
+    shell.Type(kCtrlZ);
+    ASSERT_TRUE(Says(shell, "Stopped"));
+    const std::size_t stopped = shell.Output().size();
+    shell.Type("bg; sleep 2; echo wo''ken\n");
+    ASSERT_TRUE(Says(shell, "woken\r\n", stopped));
+    EXPECT_EQ(shell.Output().find(kEnter, stopped), std::string::npos);
+    EXPECT_EQ(shell.Output().find("Daemon:", stopped), std::string::npos);
+    shell.Type("fg\n");
+    ASSERT_TRUE(Says(shell, "Ctrl-C ends.", stopped));
+    shell.Type("q");
+    EXPECT_TRUE(Says(shell, kLeave, shell.Output().rfind(kEnter)));
+}
+
 // At once: the next look would be an hour later.
 TEST_F(StatusWatchTest, WatchFollowsTheSizeOfTheTerminal) {
     PutFile(kQueue, Events(3));

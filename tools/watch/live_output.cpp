@@ -33,8 +33,9 @@ bool Write(std::string_view text) {
     return true;
 }
 
-bool IsForeground() {
-    return ::isatty(STDIN_FILENO) == 1 && ::tcgetpgrp(STDIN_FILENO) == ::getpgrp();
+// Whether the keyboard can be set and read without being stopped for it.
+bool HasKeyboard() {
+    return ::tcgetpgrp(STDIN_FILENO) == ::getpgrp();
 }
 
 std::string FooterOf(const ServiceState &service) {
@@ -59,28 +60,24 @@ std::vector<int> LiveOutput::Signals() const {
     return {SIGWINCH, SIGTSTP, SIGCONT};
 }
 
-bool LiveOutput::Begin() {
-    return Enter();
-}
-
 bool LiveOutput::Show(const WatchedState &state) {
     state_ = state;
     return Draw();
 }
 
 bool LiveOutput::Handle(int signal) {
-    switch (signal) {
-    case SIGTSTP:
-        if (!Leave()) {
-            return false;
-        }
-        (void)::raise(SIGSTOP); // goes on here when it is continued
-        return Enter() && Draw();
-    case SIGCONT: // whoever had the terminal meanwhile may have changed it
-        return (!isEntered_ || Leave()) && Enter() && Draw();
-    default:
-        return Draw();
+    // Whoever has the terminal until SIGCONT may change it.
+    if (signal != SIGWINCH && isEntered_ && !Leave()) {
+        return false;
     }
+    if (signal == SIGTSTP) {
+        (void)::raise(SIGSTOP); // goes on here when it is continued
+    }
+    return Draw();
+}
+
+bool LiveOutput::Attend() {
+    return isEntered_ == IsInForeground(STDOUT_FILENO) || Draw();
 }
 
 int LiveOutput::Input() const {
@@ -101,7 +98,14 @@ bool LiveOutput::ReadsTheEnd() {
     return std::memchr(typed.data(), 'q', static_cast<std::size_t>(count)) != nullptr;
 }
 
-bool LiveOutput::Draw() const {
+bool LiveOutput::Draw() {
+    if (!IsInForeground(STDOUT_FILENO)) {
+        return !isEntered_ || Leave();
+    }
+    return (isEntered_ || Enter()) && Write(Picture());
+}
+
+std::string LiveOutput::Picture() const {
     const ScreenSize size = SizeOfTerminal(STDOUT_FILENO);
     const std::size_t rows = size.rows > 2 ? size.rows - 2 : size.rows;
     std::vector<std::string> lines = FrameOf(state_, {rows, size.columns}, style_);
@@ -117,11 +121,11 @@ bool LiveOutput::Draw() const {
     if (lines.size() < size.rows) {
         picture += std::string("\r\n") + kClearBelow;
     }
-    return Write(picture);
+    return picture;
 }
 
 bool LiveOutput::Enter() {
-    isQuiet_ = IsForeground() && ::tcgetattr(STDIN_FILENO, &former_) == 0;
+    isQuiet_ = HasKeyboard() && ::tcgetattr(STDIN_FILENO, &former_) == 0;
     if (isQuiet_) {
         termios quiet = former_;
         quiet.c_lflag &= ~static_cast<tcflag_t>(ECHO | ICANON);
@@ -132,11 +136,11 @@ bool LiveOutput::Enter() {
 }
 
 bool LiveOutput::Leave() {
-    if (isQuiet_) {
+    if (isQuiet_ && HasKeyboard()) {
         (void)::tcsetattr(STDIN_FILENO, TCSAFLUSH,
                           &former_); // what was typed was not for the shell
-        isQuiet_ = false;
     }
+    isQuiet_ = false;
     isEntered_ = false;
     return Write(kLeave);
 }

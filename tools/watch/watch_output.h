@@ -24,9 +24,7 @@ class WatchOutput {
     // The signals that it wants to be told of.
     [[nodiscard]] virtual std::vector<int> Signals() const { return {}; }
 
-    // Called first. This one and the next three give false when nothing can be written.
-    [[nodiscard]] virtual bool Begin() { return true; }
-
+    // This one and the next three give false when nothing can be written.
     [[nodiscard]] virtual bool Show(const WatchedState &state) = 0;
 
     // The events are still being counted: some numbers are missing.
@@ -34,6 +32,9 @@ class WatchOutput {
 
     // One of those signals has come.
     [[nodiscard]] virtual bool Handle(int /*signal*/) { return true; }
+
+    // Called at least once a second between the looks.
+    [[nodiscard]] virtual bool Attend() { return true; }
 
     // A descriptor to be waited for, or -1; and whether what is there now asks for the end.
     [[nodiscard]] virtual int Input() const { return -1; }
