@@ -68,7 +68,7 @@ void PrintJson(const Json::Value &value, JsonMode mode) {
     builder["indentation"] = mode == JsonMode::kPretty ? "  " : "";
     builder["enableYAMLCompatibility"] = mode == JsonMode::kPretty; // "key": value
     builder["emitUTF8"] = true;
-    std::cout << BracketsRaised(Json::writeString(builder, value)) << '\n';
+    std::cout << ShownJson(BracketsRaised(Json::writeString(builder, value))) << '\n';
 }
 
 void Table::Add(const std::vector<std::string> &cells) {

@@ -19,7 +19,8 @@ enum class JsonMode { kOff, kShort, kPretty };
 // `mode` must outlive the parsing.
 void AddJsonOption(CLI::App &app, JsonMode &mode);
 
-// Names come byte for byte, also those that are not UTF-8; nothing for kOff.
+// Reading it gives names byte for byte, also those that are not UTF-8; no character that could
+// drive a terminal stands in it as it is. Nothing for kOff.
 void PrintJson(const Json::Value &value, JsonMode mode);
 
 // Rows of text under headings.

@@ -80,6 +80,21 @@ std::string Shown(const std::string &text) {
     return shown;
 }
 
+std::string ShownJson(const std::string &json) {
+    constexpr utf8proc_int32_t kDelete = 0x7f; // below it the writer's own line breaks are too
+    std::string shown;
+    for (std::size_t position = 0; position < json.size();) {
+        const Decoded decoded = DecodeAt(json, position);
+        if (decoded.character >= kDelete && NeedsEscape(decoded.character)) {
+            shown += Hex("\\u%04x", static_cast<unsigned>(decoded.character));
+        } else {
+            shown.append(json, position, decoded.bytes);
+        }
+        position += decoded.bytes;
+    }
+    return shown;
+}
+
 std::size_t Columns(const std::string &shown) {
     std::size_t columns = 0;
     for (std::size_t position = 0; position < shown.size();) {

@@ -11,6 +11,10 @@ namespace CTL {
 // are shown as escapes (\n, \x1b, \u202e, \\).
 [[nodiscard]] std::string Shown(const std::string &text);
 
+// The same JSON text with those characters escaped that a JSON writer leaves as they are though
+// Shown() escapes them: \u007f, \u202e. Bytes that are not UTF-8 stay.
+[[nodiscard]] std::string ShownJson(const std::string &json);
+
 // How many columns a terminal needs for text that Shown() has returned.
 [[nodiscard]] std::size_t Columns(const std::string &shown);
 

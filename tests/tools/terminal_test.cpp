@@ -47,6 +47,19 @@ TEST_F(CtlTest, OffATerminalNoEscapeCodeIsWritten) {
     }
 }
 
+// DEL, two C1 controls, a line separator and a change of direction are UTF-8 and come as escapes;
+// letters do not, and the last byte, which is none, stays.
+TEST_F(CtlTest, JsonCannotDriveTheTerminalAndGivesNamesBack) {
+    const std::string name = "\x7f\xc2\x80\xc2\x9b\xe2\x80\xa8\xe2\x80\xae\xc3\xa4\xff";
+    Save("{\"/photos\":{\"photo\":true,\"name\":\"" + name + "\"}}");
+    for (const char *mode : {"--json=short", "--json=pretty"}) {
+        const std::string out = Ctl({"list", mode}).out;
+        EXPECT_THAT(out, HasSubstr(R"("\u007f\u0080\u009b\u2028\u202e)"
+                                   "\xc3\xa4\xff\""));
+        EXPECT_EQ(Json(out)["folder"][0]["name"].asString(), name);
+    }
+}
+
 TEST_F(CtlTest, OnATerminalMessagesBreakBetweenWords) {
     Save(kPhotos);
     ASSERT_EQ(::symlink("2016", "/volume1/photos/link"), 0);
