@@ -90,6 +90,10 @@ std::string Quoted(const std::string &word) {
     return quoted + "'";
 }
 
+std::string ShowCommand(const std::string &folder) {
+    return "fileindexctl show " + Quoted(folder);
+}
+
 std::string Count(std::size_t number, const std::string &noun) {
     return std::to_string(number) + " " + noun + (number == 1 ? "" : "s");
 }

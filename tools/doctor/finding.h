@@ -25,10 +25,12 @@ struct Finding {
     std::string why;
     std::vector<std::string> quote;                       // lines to be shown as they are
     std::string mend;                                     // what to do about it
-    std::string command;                                  // the command that does it
+    std::string command;                                  // a command line towards that
     Json::Value details = Json::Value(Json::objectValue); // further facts for scripts
 
     Finding &&Because(std::string text) &&;
+    // Whoever runs a command line without reading the text must not change what is indexed: where
+    // only that would help, it looks closer, or there is none.
     Finding &&Mend(std::string text, std::string line = {}) &&;
     Finding &&With(const char *key, const Json::Value &value) &&;
 };
@@ -45,6 +47,9 @@ using Findings = std::vector<Finding>;
 
 // A word of a command line, quoted where the shell needs it and readable on any terminal.
 [[nodiscard]] std::string Quoted(const std::string &word);
+
+// The command line that shows a folder's setting.
+[[nodiscard]] std::string ShowCommand(const std::string &folder);
 
 // "1 folder", "2 folders".
 [[nodiscard]] std::string Count(std::size_t number, const std::string &noun);

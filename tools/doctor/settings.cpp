@@ -5,6 +5,7 @@
 
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
+#include "folder_view.h"
 #include "text.h"
 
 namespace CTL::DOCTOR {
@@ -15,8 +16,8 @@ constexpr char kRestore[] = "Mend it by hand, or bring it back from a backup. Mo
                             "counts as empty.";
 constexpr std::size_t kMaxFolders = 1000;
 
-std::string MoveAway(const std::string &path) {
-    return "mv " + path + " " + path + ".broken";
+std::string EditCommand(const std::string &path) {
+    return "editor " + Quoted(path);
 }
 
 // Whether the directory is one that files can be looked for in.
@@ -62,17 +63,15 @@ void LookAtOwner(Findings &findings, const std::string &path) {
 // The file as JSON. False when that is all that can be said of it.
 bool LookAtJson(Findings &findings, const JsonFile &file) {
     const std::optional<Finding> mistake = MistakeOf(file, "settings");
-    if (mistake && mistake->severity == Severity::kUnknown) {
-        findings.push_back(*mistake);
-        return false;
-    }
     if (mistake) {
-        findings.push_back(Finding(*mistake).Mend(kRestore, MoveAway(file.path)));
+        const bool isReadable = file.state == JsonFile::State::kMalformed;
+        findings.push_back(isReadable ? Finding(*mistake).Mend(kRestore, EditCommand(file.path))
+                                      : *mistake);
         return false;
     }
     if (file.state == JsonFile::State::kGood && !file.value.isObject()) {
         findings.push_back(Error("settings-shape", file.path, file.path + " is no JSON object")
-                               .Mend(kRestore, MoveAway(file.path)));
+                               .Mend(kRestore, EditCommand(file.path)));
         return false;
     }
     return true;
@@ -85,7 +84,7 @@ std::string OddMemberOf(const Json::Value &folder) {
     if (folder.isMember("name") && !folder["name"].isString()) {
         return "its \"name\" is no text";
     }
-    for (const char *type : {"document", "audio", "video", "photo"}) {
+    for (const char *type : kFileTypes) {
         if (folder.isMember(type) && !folder[type].isBool()) {
             return std::string("its \"") + type + "\" is neither true nor false";
         }
@@ -107,7 +106,7 @@ void LookAtFolders(Findings &findings, const JsonFile &file) {
                 Warning("settings-member", path,
                         "The folder " + Shown(path) + " is set oddly: " + member)
                     .Because("What cannot be read counts as no.")
-                    .Mend("Set it anew.", "fileindexctl add " + Quoted(path) + " --photo"));
+                    .Mend("Set it anew (set, with a name and all types).", ShowCommand(path)));
         }
     }
     if (file.value.size() > kMaxFolders) {
@@ -151,7 +150,7 @@ void LookAtStatus(Findings &findings, const JsonFile &file) {
                 Error("settings-member", marks,
                       std::string("status.conf: \"") + marks + "\" is no object")
                     .Because("No share can be marked.")
-                    .Mend("Take that member out by hand.", std::string("editor ") + kStatusConf));
+                    .Mend("Take that member out by hand.", EditCommand(kStatusConf)));
         }
     }
     if (findings.size() == before) {

@@ -88,7 +88,7 @@ void LookAtShare(Findings &findings, const KnownShare &share, const Json::Value 
                   "There is no share " + Shown(share.name) + ", but folders of it are set")
                 .Because("It was removed or renamed without the index being told.")
                 .Mend("Drop its folders, or move them to its new name (share rename).",
-                      "fileindexctl remove " + Quoted(share.folders.front().path)));
+                      "fileindexctl share remove " + Quoted(share.name)));
         return;
     }
     const int error = DirectoryError(share.directory);
