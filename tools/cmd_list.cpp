@@ -87,6 +87,8 @@ void PrintFolders(const std::vector<Json::Value> &folders, std::size_t total,
     answer["offset"] = Json::UInt64{options.offset};
     answer["total"] = Json::UInt64{total};
     Table table({"PATH", "NAME", "TYPES", "STATUS"});
+    table.MayCut("PATH", 20);
+    table.MayCut("NAME", 10);
     for (const Json::Value &setting : folders) {
         const Json::Value folder = WithFacts(setting);
         table.Add({folder["path"].asString(), folder["name"].asString(), TypesOf(folder),

@@ -2,13 +2,12 @@
 #include <memory>
 #include <unistd.h>
 
-#include "colour.h"
 #include "command.h"
-#include "folder_view.h"
 #include "messages.h"
 #include "output.h"
 #include "paths.h"
 #include "status/observer.h"
+#include "status/service_screen.h"
 #include "terminal.h"
 
 namespace CTL {
@@ -36,22 +35,13 @@ struct Options {
 };
 
 void PrintText(const ServiceState &state) {
-    std::cout << "Daemon:   "
-              << Coloured(NameOf(state.daemon), ColourOf(state.daemon), MayUseColour()) << '\n';
-    std::cout << "Indexing: " << PauseTextOf(state) << '\n';
-    for (const std::string &note : NotesOf(state)) {
-        std::cout << "Note:     " << note << '\n';
+    for (const HeadLine &line : HeadOf(state)) {
+        std::cout << line.label << Coloured(line.text, line.colour, MayUseColour()) << '\n';
     }
-    if (state.folders.empty()) {
-        return;
+    if (!state.folders.empty()) {
+        std::cout << '\n';
+        PrintGrid(FoldersOf(state, LineWidth(STDOUT_FILENO)));
     }
-    std::cout << '\n';
-    Table table({"PATH", "STATE", "TYPES", "VALID", "PENDING"});
-    for (const FolderState &folder : state.folders) {
-        table.Add({folder.path, StatusTextOf(folder), TypesOf(folder.setting),
-                   folder.isValid ? "yes" : "no", CountText(folder.pending)});
-    }
-    table.Print();
 }
 
 // By the convention of init scripts.

@@ -1,7 +1,6 @@
 #include "output.h"
 
 #include <CLI/CLI.hpp>
-#include <algorithm>
 #include <iostream>
 #include <json/writer.h>
 #include <unistd.h>
@@ -12,8 +11,6 @@
 namespace CTL {
 
 namespace {
-
-constexpr char kGap[] = "  ";
 
 // What CLI11 reads into a JsonMode: the number of the one that `word` names.
 std::string JsonModeNumber(const std::string &word) {
@@ -39,11 +36,12 @@ std::string BracketsRaised(const std::string &text) {
     return raised + text.substr(position);
 }
 
-void PrintRow(const std::vector<std::string> &cells, const std::vector<std::size_t> &widths) {
-    for (std::size_t column = 0; column + 1 < cells.size(); ++column) {
-        std::cout << Padded(cells[column], widths[column]) << kGap;
+std::vector<GridColumn> ColumnsUnder(const std::vector<std::string> &headings) {
+    std::vector<GridColumn> columns(headings.size());
+    for (std::size_t i = 0; i < headings.size(); ++i) {
+        columns[i].heading = headings[i];
     }
-    std::cout << cells.back();
+    return columns;
 }
 
 } // namespace
@@ -71,34 +69,24 @@ void PrintJson(const Json::Value &value, JsonMode mode) {
     std::cout << ShownJson(BracketsRaised(Json::writeString(builder, value))) << '\n';
 }
 
+void PrintGrid(const Grid &grid) {
+    const std::vector<std::string> lines =
+        IsTerminal(STDOUT_FILENO) ? grid.Lines(LineWidth(STDOUT_FILENO), StyleOfOutput())
+                                  : grid.Rows();
+    for (const std::string &line : lines) {
+        std::cout << line << '\n';
+    }
+}
+
+Table::Table(const std::vector<std::string> &headings) : grid_(ColumnsUnder(headings)) {}
+
 void Table::Add(const std::vector<std::string> &cells) {
     std::vector<std::string> row;
     row.reserve(cells.size());
     for (const std::string &cell : cells) {
         row.push_back(cell.empty() ? "-" : Shown(cell));
     }
-    rows_.push_back(std::move(row));
-}
-
-void Table::Print() const {
-    const bool hasHeadings = IsTerminal(STDOUT_FILENO);
-    std::vector<std::size_t> widths;
-    for (std::size_t column = 0; column < headings_.size(); ++column) {
-        std::size_t width = hasHeadings ? Columns(headings_[column]) : 0;
-        for (const auto &row : rows_) {
-            width = std::max(width, Columns(row[column]));
-        }
-        widths.push_back(width);
-    }
-    if (hasHeadings) {
-        std::cout << (MayUseColour() ? "\033[1m" : "");
-        PrintRow(headings_, widths);
-        std::cout << (MayUseColour() ? "\033[0m\n" : "\n");
-    }
-    for (const auto &row : rows_) {
-        PrintRow(row, widths);
-        std::cout << '\n';
-    }
+    grid_.Add(row);
 }
 
 } // namespace CTL

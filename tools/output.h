@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "grid.h"
+
 namespace CLI {
 class App;
 }
@@ -23,20 +25,28 @@ void AddJsonOption(CLI::App &app, JsonMode &mode);
 // drive a terminal stands in it as it is. Nothing for kOff.
 void PrintJson(const Json::Value &value, JsonMode mode);
 
+// To standard output: on a terminal under headings and no wider than it, elsewhere the rows alone,
+// whole.
+void PrintGrid(const Grid &grid);
+
 // Rows of text under headings.
 class Table {
   public:
-    explicit Table(std::vector<std::string> headings) : headings_(std::move(headings)) {}
+    explicit Table(const std::vector<std::string> &headings);
+
+    // Where the terminal has no room for all, the cells under this heading are cut in their middle,
+    // but not below `narrowest` columns. A table without such a heading is never cut.
+    void MayCut(const std::string &heading, std::size_t narrowest) {
+        grid_.MayCut(heading, narrowest);
+    }
 
     // As many cells as there are headings; an empty one shows as "-".
     void Add(const std::vector<std::string> &cells);
 
-    // To standard output, in aligned columns; the headings on a terminal only.
-    void Print() const;
+    void Print() const { PrintGrid(grid_); }
 
   private:
-    std::vector<std::string> headings_;
-    std::vector<std::vector<std::string>> rows_;
+    Grid grid_;
 };
 
 } // namespace CTL

@@ -129,8 +129,22 @@ TEST_F(StatusWatchTest, StatusOnATerminalHasHeadings) {
                               "Indexing: not paused\r\n"
                               "\r\n"
                               "PATH          STATE     TYPES           VALID  PENDING\r\n"
-                              "/media/films  finished  document,video  yes    0\r\n"
-                              "/photos       finished  photo           yes    0\r\n");
+                              "/media/films  finished  document,video  yes          0\r\n"
+                              "/photos       finished  photo           yes          0\r\n");
+}
+
+TEST_F(StatusWatchTest, StatusFitsATerminalAndIsWholeElsewhere) {
+    const std::string path = "/photos/" + std::string(90, 'x') + "/end";
+    MakeDirs("/volume1" + path);
+    PutFile(kFolders, "{\"" + path + "\":{\"photo\":true}}");
+    PtyChild child({FILEINDEXCTL_PATH, "status"}, kPlainTerminal, 24, 80);
+    EXPECT_EQ(child.Wait(), kPaused);
+    EXPECT_THAT(child.Output(), HasSubstr("\r\n/photos/xxxxxxxxxxxxxx...xxxxxxxxxxxxxxxxxx/end"
+                                          "  finished  photo  yes          0\r\n"));
+    PtyChild narrow({FILEINDEXCTL_PATH, "status"}, kPlainTerminal, 24, 40);
+    EXPECT_EQ(narrow.Wait(), kPaused);
+    EXPECT_THAT(narrow.Output(), HasSubstr("\r\n/photos/x...xxxxx/end  finished        0\r\n"));
+    EXPECT_THAT(Ctl({"status"}).out, HasSubstr("\n" + path + "  finished  photo  yes  0\n"));
 }
 
 TEST_F(StatusWatchTest, StatusIsColouredOnATerminalThatCanShowIt) {

@@ -21,6 +21,33 @@ TEST_F(CtlTest, TablesOnATerminalHaveHeadings) {
               CtlOnTerminal("TERM=xterm", "list"));
 }
 
+TEST_F(CtlTest, TablesFitATerminalAndAreWholeElsewhere) {
+    const std::string deep = std::string(60, 'x') + "/end";
+    MakeDirs("/volume1/photos/" + deep);
+    MakeDirs("/volume2/" + deep + "/media");
+    PutFile(kShares, R"({"photos":"/volume1/photos","media":"/volume2/)" + deep + R"(/media"})");
+    Save("{\"/photos/" + deep + "\":{\"photo\":true,\"name\":\"" + std::string(60, 'y') + "\"}}");
+    EXPECT_EQ(
+        CtlOnTerminal("TERM=dumb LC_ALL=C", "list"),
+        "PATH                            NAME                             TYPES  STATUS\r\n"
+        "/photos/xxxxx...xxxxxxxxxx/end  yyyyyyyyyyyyyy...yyyyyyyyyyyyyy  photo  finished\r\n");
+    EXPECT_EQ(CtlOnTerminal("TERM=dumb LC_ALL=C", "share list"),
+              "SHARE   DIRECTORY                                                 FOLDERS  STATE\r\n"
+              "media   /volume2/xxxxxxxxxxxxxxxxx...xxxxxxxxxxxxxxxxx/end/media  0        -\r\n"
+              "photos  /volume1/photos                                           1        -\r\n");
+    EXPECT_EQ(Ctl({"list"}).out,
+              "/photos/" + deep + "  " + std::string(60, 'y') + "  photo  finished\n");
+    EXPECT_THAT(Ctl({"share", "list"}).out, HasSubstr("media   /volume2/" + deep + "/media  0"));
+}
+
+TEST_F(CtlTest, WhatShowTellsIsNeverCut) {
+    const std::string path = "/photos/" + std::string(120, 'x');
+    MakeDirs("/volume1" + path);
+    Save("{\"" + path + "\":{\"photo\":true}}");
+    EXPECT_THAT(CtlOnTerminal("TERM=dumb", "show " + path),
+                HasSubstr("full path  /volume1" + path + "\r\n"));
+}
+
 TEST_F(CtlTest, OnATerminalJIsPretty) {
     Save(kPhotos);
     EXPECT_THAT(CtlOnTerminal("TERM=xterm", "list -j"), HasSubstr("  \"total\": 1\r\n"));

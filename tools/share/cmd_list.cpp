@@ -56,6 +56,8 @@ void PrintShares(const std::vector<ShareFacts> &shares, JsonMode json) {
     Json::Value answer(Json::objectValue);
     answer["share"] = Json::Value(Json::arrayValue);
     Table table({"SHARE", "DIRECTORY", "FOLDERS", "STATE"});
+    table.MayCut("SHARE", 12);
+    table.MayCut("DIRECTORY", 20);
     for (const ShareFacts &share : shares) {
         table.Add(
             {share.name, share.directory, std::to_string(share.folders.size()), StateText(share)});

@@ -65,7 +65,7 @@ std::string StatusTextOf(const FolderState &folder) {
     return StatusOf(JsonOf(folder));
 }
 
-std::string CountText(const std::optional<std::uint64_t> &count) {
+std::string PendingText(const std::optional<std::uint64_t> &count) {
     return count ? std::to_string(*count) : "?";
 }
 

@@ -51,7 +51,7 @@ struct ServiceState {
 [[nodiscard]] std::string StatusTextOf(const FolderState &folder);
 
 // "?" where it is missing.
-[[nodiscard]] std::string CountText(const std::optional<std::uint64_t> &count);
+[[nodiscard]] std::string PendingText(const std::optional<std::uint64_t> &count);
 
 [[nodiscard]] Json::Value JsonOf(const ServiceState &state);
 

@@ -13,7 +13,7 @@ namespace {
 
 std::string TextOf(const WatchedState &state, std::size_t share) {
     const ShareState &shown = state.service.shares[share];
-    std::string text = CountText(shown.pending) + " pending";
+    std::string text = PendingText(shown.pending) + " pending";
     if (shown.pending.value_or(0) > 0) {
         text += ", " + PercentText(state.progress[share]);
     }
