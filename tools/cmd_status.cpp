@@ -17,6 +17,8 @@ namespace {
 constexpr char kFooter[] =
     R"(Shows the folders that lie at or below a PATH or contain it; all without one.
 Pending are the events of the share's queue that the daemon has not done yet.
+The daemon counts as running when it listens for commands; whether it answers
+too is asked by fileindexctl doctor.
 
 Exit status: 0 running, 3 paused or not running, 4 that could not be told, or
 no such folder; 2 mistake in the call.

@@ -134,4 +134,8 @@ std::string Wrapped(const std::string &shown, std::size_t columns, std::size_t i
     return text;
 }
 
+std::string Count(std::size_t number, const std::string &noun) {
+    return std::to_string(number) + " " + noun + (number == 1 ? "" : "s");
+}
+
 } // namespace CTL

@@ -26,6 +26,9 @@ namespace CTL {
 [[nodiscard]] std::string Wrapped(const std::string &shown, std::size_t columns,
                                   std::size_t indent);
 
+// "1 folder", "2 folders".
+[[nodiscard]] std::string Count(std::size_t number, const std::string &noun);
+
 } // namespace CTL
 
 #endif

@@ -174,6 +174,13 @@ TEST_F(StatusWatchTest, StatusDoesNotBotherTheDaemon) {
     EXPECT_EQ(ReadText(kPeerOut), ""); // neither a command nor a refused one
 }
 
+TEST_F(StatusWatchTest, StatusDoesNotWaitForADaemonThatListensWithoutAnswering) {
+    StartDaemon();
+    daemon_->Signal(SIGSTOP);
+    EXPECT_EQ(Ctl({"status"}).status, kDone);
+    daemon_->Signal(SIGCONT);
+}
+
 TEST_F(StatusWatchTest, StatusOfAPauseIsThreeAndTellsItsEnd) {
     StartDaemon();
     PutFile(kQueue, Events(1));

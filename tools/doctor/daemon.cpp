@@ -3,12 +3,10 @@
 #include <array>
 #include <cerrno>
 #include <chrono>
-#include <cstring>
 #include <poll.h>
 #include <sys/socket.h>
-#include <sys/un.h>
 
-#include "base/unique_fd.h"
+#include "daemon.h"
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
 #include "doctor/process.h"
@@ -39,17 +37,6 @@ Finding NotRunning(const Machine &machine, const std::string &what) {
                       .Mend("Mend the settings first, then start it.", StartCommand());
     }
     return finding;
-}
-
-// 0, or the errno.
-int Connect(const UniqueFd &connection) {
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::memcpy(address.sun_path, kDaemonSocket, sizeof(kDaemonSocket));
-    return ::connect(connection.Get(), reinterpret_cast<const sockaddr *>(&address),
-                     sizeof(address)) == 0
-               ? 0
-               : errno;
 }
 
 pid_t ListenerOf(const UniqueFd &connection) {
@@ -106,7 +93,7 @@ Finding Running(const Machine &machine, const UniqueFd &connection) {
 
 Findings CheckDaemon(const Machine &machine) {
     const UniqueFd connection(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
-    const int error = connection ? Connect(connection) : errno;
+    const int error = connection ? ConnectToDaemon(connection) : errno;
     switch (error) {
     case 0:
         return {Running(machine, connection)};

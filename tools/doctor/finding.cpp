@@ -94,10 +94,6 @@ std::string ShowCommand(const std::string &folder) {
     return "fileindexctl show " + Quoted(folder);
 }
 
-std::string Count(std::size_t number, const std::string &noun) {
-    return std::to_string(number) + " " + noun + (number == 1 ? "" : "s");
-}
-
 std::string Duration(long long seconds) {
     constexpr long long kHour = 3600;
     constexpr long long kDay = 24 * kHour;

@@ -16,7 +16,6 @@ constexpr char kStatusConf[] = "/usr/vano/etc/fileindex/status.conf";
 constexpr char kFolderLock[] = "/tmp/fileidx_cfg_folder.lock";
 constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
 constexpr char kMonitorDirectory[] = "/usr/vano/etc/vanotifyd";
-constexpr char kDaemonSocket[] = "/var/run/fileindexd.sock";
 
 // A share of the table, or one that a folder names.
 struct KnownShare : Share {

@@ -54,10 +54,6 @@ ExitCode SayNoFolders(const std::string &share) {
     return kNotFound;
 }
 
-std::string CountText(const std::vector<Folder> &folders) {
-    return folders.size() == 1 ? "1 folder" : std::to_string(folders.size()) + " folders";
-}
-
 ExitCode RunRemove(RemoveOptions &options) {
     ShareFacts share;
     const std::string failure = "Cannot remove the folders of share " + Shown(options.share);
@@ -78,7 +74,8 @@ ExitCode RunRemove(RemoveOptions &options) {
     if (!While("Removing", [&] { return IndexMgr::ShareRemove(share.name); })) {
         return Fail(failure);
     }
-    Say("Removed " + CountText(share.folders) + " of share " + Shown(share.name) + ".");
+    Say("Removed " + Count(share.folders.size(), "folder") + " of share " + Shown(share.name) +
+        ".");
     if (!share.directory.empty()) {
         Advise("Its index is still there: fileindexctl share clean deletes it.");
     }

@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "daemon_state.h"
+#include "daemon.h"
 
 // How the service is at one moment. A number of events is missing where the queue cannot be read.
 

@@ -1,33 +1,30 @@
-#include "daemon_state.h"
+#include "daemon.h"
 
 #include <cerrno>
 #include <cstring>
 #include <sys/socket.h>
 #include <sys/un.h>
 
-#include "base/unique_fd.h"
-
 namespace CTL {
 
-namespace {
+using VANO::FILEINDEX::UniqueFd;
 
-constexpr char kSocketPath[] = "/var/run/fileindexd.sock";
-
-} // namespace
+int ConnectToDaemon(const UniqueFd &socket) {
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    std::memcpy(address.sun_path, kDaemonSocket, sizeof(kDaemonSocket));
+    return ::connect(socket.Get(), reinterpret_cast<const sockaddr *>(&address), sizeof(address)) ==
+                   0
+               ? 0
+               : errno;
+}
 
 DaemonState AskDaemonState() {
     // A real connection would be one without a command, which the daemon may complain about. A
     // datagram socket is refused by the kernel, and the reason tells a stream socket that somebody
     // holds (EPROTOTYPE) from the one that a dead daemon left behind.
-    const VANO::FILEINDEX::UniqueFd probe(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::strncpy(address.sun_path, kSocketPath, sizeof(address.sun_path) - 1);
-    if (!probe || ::connect(probe.Get(), reinterpret_cast<const sockaddr *>(&address),
-                            sizeof(address)) == 0) {
-        return DaemonState::kUnknown;
-    }
-    switch (errno) {
+    const UniqueFd probe(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
+    switch (probe ? ConnectToDaemon(probe) : errno) {
     case EPROTOTYPE:
         return DaemonState::kRunning;
     case ENOENT:
