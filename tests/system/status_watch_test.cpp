@@ -13,6 +13,7 @@
 #include "support/files.h"
 #include "system/child.h"
 #include "system/pty_child.h"
+#include "tools/ctl.h"
 
 namespace VANO::TESTS {
 namespace {
@@ -25,26 +26,11 @@ using ::testing::Not;
 using ::testing::SizeIs;
 using ::testing::StartsWith;
 
-using Words = std::vector<std::string>;
-
-constexpr char kFolders[] = "/usr/vano/etc/fileindex/folder.conf";
-constexpr char kStatus[] = "/usr/vano/etc/fileindex/status.conf";
-constexpr char kShares[] = "/usr/vano/etc/shares.json";
-constexpr char kSocket[] = "/run/fileindexd.sock";
-const std::string kPeerOut = "/tmp/peer.out";
-const std::string kQueue = "/volume1/photos/@eaDir/VANO@file_index_queue";
+const std::string kQueue = kPhotoQueue;
 const std::string kTaken = kQueue + ".tmp";
 
-constexpr int kDone = 0;
-constexpr int kFailed = 1;
-constexpr int kUsage = 2;
 constexpr int kPaused = 3;
-constexpr int kNotFound = 3;
 constexpr int kUnknown = 4;
-
-constexpr char kTwo[] =
-    R"({"/photos":{"path":"/photos","name":"Photos","document":false,"audio":false,"video":false,"photo":true},)"
-    R"("/media/films":{"path":"/media/films","name":"","document":true,"audio":false,"video":true,"photo":false}})";
 
 const Words kColourTerminal{"TERM=xterm-256color", "LC_ALL=C.UTF-8"};
 const Words kPlainTerminal{"TERM=vt100", "LC_ALL=C", "NO_COLOR=1"};
@@ -53,11 +39,6 @@ constexpr char kEnter[] = "\033[?1049h\033[?25l";
 constexpr char kLeave[] = "\033[?25h\033[?1049l";
 constexpr char kCtrlC[] = "\x03";
 constexpr char kCtrlZ[] = "\x1a";
-
-Outcome Ctl(Words arguments) {
-    arguments.insert(arguments.begin(), FILEINDEXCTL_PATH);
-    return RunToEnd(arguments);
-}
 
 std::string Events(int count, const std::string &path = "/volume1/photos/a") {
     std::string text;
@@ -83,28 +64,14 @@ std::string WithoutStamp(const std::string &line) {
     return std::regex_replace(line, kStamp, "@ ");
 }
 
-class StatusWatchTest : public ::testing::Test {
+class StatusWatchTest : public CtlTest {
   protected:
     void SetUp() override {
-        for (const std::string &path :
-             {std::string(kFolders), std::string(kStatus), kPeerOut, std::string(kSocket),
-              std::string("/volume1/photos"), std::string("/volume2/media")}) {
-            RemoveTree(path);
-        }
-        PutFile(kShares, R"({"photos":"/volume1/photos","media":"/volume2/media"})");
-        MakeDirs("/volume1/photos/2016");
-        MakeDirs("/volume2/media/films");
-        PutFile(kFolders, kTwo);
+        CtlTest::SetUp();
+        Save(kTwo);
     }
 
-    // One that leaves the queues of the shares alone, or one that works them off.
-    void StartDaemon(const std::string &queue = "/tmp/none") {
-        daemon_ = std::make_unique<Child>(Words{PEER_PATH, "--queue", queue, "--interval", "20"},
-                                          kPeerOut, "/tmp/peer.err");
-        ASSERT_TRUE(Eventually([] { return Exists(kSocket); }));
-    }
-
-    std::unique_ptr<Child> daemon_;
+    void StartDaemonAtWork() { StartDaemon({"--queue", kQueue, "--interval", "20"}); }
 };
 
 // --- status -------------------------------------------------------------------------------------
@@ -169,9 +136,7 @@ TEST_F(StatusWatchTest, StatusDoesNotBotherTheDaemon) {
     for (int i = 0; i < 3; ++i) {
         EXPECT_EQ(Ctl({"status"}).status, kDone);
     }
-    daemon_->Signal(SIGTERM);
-    EXPECT_EQ(daemon_->Wait(), 0);
-    EXPECT_EQ(ReadText(kPeerOut), ""); // neither a command nor a refused one
+    EXPECT_THAT(Told(), IsEmpty()); // neither a command nor a refused one
 }
 
 TEST_F(StatusWatchTest, StatusDoesNotWaitForADaemonThatListensWithoutAnswering) {
@@ -431,7 +396,7 @@ TEST_F(StatusWatchTest, WatchFollowsTheDaemonAtWork) {
     const WatchedLines watched({});
     ASSERT_TRUE(Eventually(
         [] { return WatchedLines::HasLine("@ share photos  1000 pending, 0 %, daemon stopped"); }));
-    StartDaemon(kQueue);
+    StartDaemonAtWork();
     ASSERT_TRUE(
         Eventually([] { return WatchedLines::HasLine("@ share photos  0 pending, finished"); }));
     EXPECT_TRUE(Eventually([] { return WatchedLines::HasLine("@ daemon  running"); }));
@@ -568,7 +533,7 @@ TEST_F(StatusWatchTest, WatchFollowsTheDaemonOnATerminal) {
     PutFile(kQueue, Events(500));
     const auto child = WatchOnTerminal();
     ASSERT_TRUE(Eventually([&] { return Shows(*child, "daemon stopped"); }));
-    StartDaemon(kQueue);
+    StartDaemonAtWork();
     EXPECT_TRUE(Eventually([&] {
         return Shows(*child, "Daemon:   running") && Shows(*child, "/photos       finished");
     }));

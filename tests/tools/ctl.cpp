@@ -7,9 +7,7 @@ namespace VANO::TESTS {
 
 namespace {
 
-constexpr char kSocket[] = "/run/fileindexd.sock";
 constexpr char kService[] = "/etc/init.d/fileindexd";
-constexpr char kPeerOut[] = "/tmp/peer.out";
 
 } // namespace
 
@@ -52,10 +50,9 @@ void CtlTest::SetUp() {
     ASSERT_EQ(::chmod(kService, 0755), 0);
 }
 
-void CtlTest::StartDaemon() {
-    // Long pauses between looks at a queue that is not there.
-    daemon_ = std::make_unique<Child>(Words{PEER_PATH, "--queue", "/tmp/none"}, kPeerOut,
-                                      "/tmp/peer.err");
+void CtlTest::StartDaemon(Words options) {
+    options.insert(options.begin(), PEER_PATH);
+    daemon_ = std::make_unique<Child>(options, kPeerOut, "/tmp/peer.err");
     ASSERT_TRUE(Eventually([] { return Exists(kSocket); }));
 }
 

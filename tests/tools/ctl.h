@@ -23,6 +23,8 @@ inline constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
 inline constexpr char kShares[] = "/usr/vano/etc/shares.json";
 inline constexpr char kMonitors[] = "/usr/vano/etc/vanotifyd";
 inline constexpr char kPhotoQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";
+inline constexpr char kSocket[] = "/run/fileindexd.sock";
+inline constexpr char kPeerOut[] = "/tmp/peer.out"; // what the daemon was told
 inline constexpr char kPhotoIndex[] = "/volume1/photos/@eaDir/VANO@.fileindexdb";
 
 inline constexpr int kDone = 0;
@@ -53,15 +55,15 @@ class CtlTest : public ::testing::Test {
   protected:
     void SetUp() override;
 
-    // Most changes need somebody who listens. It leaves the queues as they are.
-    void StartDaemon();
+    // Most changes need somebody who listens. It leaves the queues of the shares as they are,
+    // unless its options say otherwise.
+    void StartDaemon(Words options = {"--queue", "/tmp/none"});
 
     // What the daemon was told so far; it is gone then.
     Words Told();
 
     static void Save(const std::string &folders) { PutFile(kFolders, folders); }
 
-  private:
     std::unique_ptr<Child> daemon_;
 };
 

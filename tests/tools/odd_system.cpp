@@ -1,9 +1,16 @@
 // Stands before the system's libraries, by LD_PRELOAD, and answers what no test can bring about for
-// real: a file system of any type, a share whose properties cannot be read, a later time.
+// real: a file system of any type, a share whose properties cannot be read, a later time, a path
+// that not even root reaches, a file that cannot be read.
 
+#include <cerrno>
 #include <chrono>
 #include <cstdlib>
+#include <cstring>
 #include <ctime>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 
 #include "platform/vano_platform.h"
 
@@ -32,4 +39,24 @@ extern "C" __attribute__((visibility("default"))) std::time_t time(std::time_t *
         *out = now;
     }
     return now;
+}
+
+extern "C" __attribute__((visibility("default"))) int stat(const char *path,
+                                                           struct stat *info) noexcept {
+    const char *unreachable = std::getenv("ODD_UNREACHABLE");
+    if (unreachable != nullptr && std::strcmp(path, unreachable) == 0) {
+        errno = EACCES;
+        return -1;
+    }
+    return ::fstatat(AT_FDCWD, path, info, 0);
+}
+
+extern "C" __attribute__((visibility("default"))) ssize_t pread(int file, void *out,
+                                                                std::size_t bytes, off_t offset) {
+    const int error = Setting("ODD_READ_ERROR", 0);
+    if (error != 0) {
+        errno = error;
+        return -1;
+    }
+    return ::syscall(SYS_pread64, file, out, bytes, offset);
 }
