@@ -71,7 +71,8 @@ bool CollectFacts(Json::Value &facts, const Folder &folder, const Json::Value &k
     if (!keys.isArray()) {
         return RefuseKeys(97, keys);
     }
-    for (Json::ArrayIndex index = 0; index < keys.size(); ++index) { // an iterator skips holes
+    // NOLINTNEXTLINE(modernize-loop-convert): an iterator skips holes
+    for (Json::ArrayIndex index = 0; index < keys.size(); ++index) {
         if (!keys[index].isString()) {
             return RefuseKeys(104, keys[index]);
         }

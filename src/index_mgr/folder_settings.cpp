@@ -74,7 +74,8 @@ struct Touched {
 
 bool ApplyUpserts(Touched &touched, Folders &settings, const Json::Value &request) {
     Json::Value report;
-    for (Json::ArrayIndex index = 0; index < request.size(); ++index) { // an iterator skips holes
+    // NOLINTNEXTLINE(modernize-loop-convert): an iterator skips holes
+    for (Json::ArrayIndex index = 0; index < request.size(); ++index) {
         const Json::Value &element = request[index];
         if (!settings.Upsert(report, element)) {
             LogError(kIndexMgrUnit, __LINE__, "Upsert failed, folder=%s",
@@ -120,6 +121,7 @@ bool QueueChanges(const std::map<std::string, Json::Value> &reports) {
 // `lastReport` holds the report of the last path that could be resolved, under that path.
 bool ApplyDeletes(std::set<std::string> &shares, Json::Value &lastReport, Folders &settings,
                   const Json::Value &request) {
+    // NOLINTNEXTLINE(modernize-loop-convert): an iterator skips holes
     for (Json::ArrayIndex index = 0; index < request.size(); ++index) {
         const Json::Value &element = request[index];
         if (!element.isConvertibleTo(Json::stringValue)) {
@@ -190,6 +192,7 @@ bool SettleShares(const std::set<std::string> &shares) {
 // a share is indexed is asked once: each time folder.conf is read.
 bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
     std::set<std::string> checked;
+    // NOLINTNEXTLINE(modernize-loop-convert): an iterator skips holes
     for (Json::ArrayIndex index = 0; index < paths.size(); ++index) {
         const Json::Value &element = paths[index];
         if (!element.isString()) {
