@@ -120,6 +120,25 @@ TEST_F(FileIoTest, AnInterruptedOrShortReadGoesOn) {
     EXPECT_EQ(read, "text");
 }
 
+// Another program rewrites it in place, and it becomes longer than it was when it was opened.
+TEST_F(FileIoTest, AFileThatGrowsIsReadToItsEnd) {
+    for (const std::size_t limit : {std::size_t{20010}, std::size_t{20009}}) {
+        PutFile(kFile, std::string(10, 'a'));
+        bool hasGrown = false;
+        Fault::On(Call::Read, [&](CallInfo &) -> std::optional<long> {
+            if (!hasGrown) {
+                hasGrown = true;
+                const KitScope kit;
+                PutFile(kFile, std::string(20010, 'b'));
+            }
+            return std::nullopt;
+        });
+        std::string read;
+        EXPECT_EQ(ReadFile(read, kFile, limit), limit == 20010U);
+        EXPECT_TRUE(limit != 20010U || read == std::string(20010, 'b')) << read.size();
+    }
+}
+
 TEST_F(FileIoTest, AFailingReadIsAFailure) {
     PutFile(kFile, "text");
     Fault::Fail(Call::Read, EIO);
