@@ -113,6 +113,14 @@ TEST_F(QueueCounterTest, NamesAreBytes) {
     EXPECT_EQ(bytes.EventsOf(0), 1U);
 }
 
+// Only a second reading could see that.
+void BlankTheFirst(std::size_t bytes) {
+    const int fd = ::open(kQueue.c_str(), O_WRONLY | O_CLOEXEC);
+    const std::string blanks(bytes, ' ');
+    EXPECT_EQ(::pwrite(fd, blanks.data(), blanks.size(), 0), static_cast<ssize_t>(blanks.size()));
+    ::close(fd);
+}
+
 TEST_F(QueueCounterTest, GoesOnWhereItStopped) {
     PutFile(kQueue, Event("/v/a"));
     EXPECT_EQ(Count(), 1U);
@@ -126,10 +134,7 @@ TEST_F(QueueCounterTest, DoesNotReadAgainWhatItHasCounted) {
     const std::string old = Event("/v/a");
     PutFile(kQueue, Times(100, old));
     EXPECT_EQ(Count(), 100U);
-    const int fd = ::open(kQueue.c_str(), O_WRONLY | O_CLOEXEC);
-    const std::string blanks(50 * old.size(), ' ');
-    EXPECT_EQ(::pwrite(fd, blanks.data(), blanks.size(), 0), static_cast<ssize_t>(blanks.size()));
-    ::close(fd);
+    BlankTheFirst(50 * old.size());
     Append(kQueue, Event("/v/a"));
     EXPECT_EQ(Count(), 101U);
 }
@@ -166,11 +171,7 @@ TEST_F(QueueCounterTest, AQueueTakenOverIsNotCountedAgain) {
     const std::string old = Event("/v/a");
     PutFile(kQueue, Times(100, old));
     EXPECT_EQ(Count(), 100U);
-    // Only a second reading could see that.
-    const int fd = ::open(kQueue.c_str(), O_WRONLY | O_CLOEXEC);
-    const std::string blanks(50 * old.size(), ' ');
-    EXPECT_EQ(::pwrite(fd, blanks.data(), blanks.size(), 0), static_cast<ssize_t>(blanks.size()));
-    ::close(fd);
+    BlankTheFirst(50 * old.size());
     Rename(kQueue, kTaken);
     EXPECT_EQ(Count(), 100U);
     PutFile(kQueue, Event("/v/b"));
