@@ -13,7 +13,7 @@ install(FILES tools/completions/fileindexctl.bash RENAME fileindexctl
 install(FILES tools/completions/_fileindexctl
     DESTINATION "${CMAKE_INSTALL_DATADIR}/zsh/vendor-completions")
 install(DIRECTORY include/fileindex DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}")
-# For whoever writes a provider of the platform boundary.
+# For those who write another provider of the platform boundary.
 install(FILES src/platform/vano_platform.h src/platform/monitor_queue.h
     DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}/vanoplatform")
 

@@ -20,7 +20,7 @@ using ::LOG_LEVEL;
 ///
 /// An object lives for one operation of one thread. A change runs Lock(true), Load(), the derived
 /// class's operations, Save(), Unlock(); most readers only Load(). Destruction does not unlock:
-/// whoever called Lock(), with success or without, calls Unlock() once.
+/// call Unlock() once after each Lock(), whether it succeeded or not.
 ///
 /// A derived class names its two files and turns `root` into its own records and back.
 class FILEINDEX_API Config {
@@ -54,9 +54,9 @@ class FILEINDEX_API Config {
 
     /// Writes `root` to the file GetPath() with the mode 0644. Takes no lock.
     ///
-    /// The file is replaced atomically and flushed to disk, so that a reader, a full disk or a lost
-    /// power line meets the old text or the new one. Where it cannot be replaced it is rewritten in
-    /// place.
+    /// The file is replaced atomically and flushed to disk: a reader sees the old text or the new
+    /// one, and so does the next boot after a power loss. Where it cannot be replaced it is
+    /// rewritten in place.
     ///
     /// @return false when the text could not be written; the last error is then
     ///         FILEINDEX_ERR_SAVE and one line is logged. A mode that could not be set is logged
@@ -70,8 +70,8 @@ class FILEINDEX_API Config {
     /// @param exclusive true for the exclusive lock, which every operation of the library takes;
     ///        false for the shared one.
     /// @return false when the file cannot be opened or stays locked; the last error is then
-    ///         FILEINDEX_ERR_LOCK and one line is logged. Each attempt opens the lock file anew and
-    ///         a failed call leaves those descriptors open; Unlock() closes the last of them.
+    ///         FILEINDEX_ERR_LOCK and one line is logged. Each attempt opens the lock file again
+    ///         and a failed call leaves those descriptors open; Unlock() closes the last of them.
     bool Lock(bool exclusive);
 
     /// Releases the lock and closes the lock file; does nothing on an object that was never locked.

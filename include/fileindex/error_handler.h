@@ -22,8 +22,8 @@ enum _tag_fileindex_err_ : int {
 /// The process-wide last error of the library.
 ///
 /// Failing operations whose description names a code overwrite it, others leave it alone, and none
-/// sets it back to FILEINDEX_ERR_NONE: whoever wants to tell sets that before the call. It is a
-/// plain variable: with several threads the last writer wins.
+/// resets it to FILEINDEX_ERR_NONE: to tell whether a call set it, reset it before the call. It is
+/// a plain variable: with several threads the last writer wins.
 class ErrorHandler {
   public:
     /// Makes `code` the last error.

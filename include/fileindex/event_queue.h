@@ -11,9 +11,9 @@ namespace VANO::FILEINDEX {
 /// Appends an event to the queue file of the share that holds a path, under the queue's own lock.
 ///
 /// A pending re-index (65536) of the same path already covers any event: nothing is written. An
-/// event that cannot be queued marks the share as needing a new index instead, under the status
-/// lock. A queue that stays locked through three attempts, with a pause of 0 to 9 ms after each,
-/// drops the event.
+/// event that cannot be queued marks the share for re-indexing instead, under the status lock. A
+/// queue that stays locked through three attempts, with a pause of 0 to 9 ms after each, drops the
+/// event.
 ///
 /// Costs a scan of the share's queue file and of the one that the daemon took over.
 ///

@@ -26,8 +26,8 @@ class IndexMgr {
     // Queries take no lock, write nothing and never throw; settings that cannot be loaded answer
     // false. A folder contains itself and what lies below it, by whole path components and byte for
     // byte; nothing is normalised, and a path with a trailing "/" matches only folders that are
-    // stored with one. The forms without a list load folder.conf; whoever asks often calls List()
-    // once and passes the list.
+    // stored with one. The forms without a list load folder.conf; for many queries call List()
+    // once and pass the list.
 
     /// @return whether an indexed folder lies in the share. One line is logged for each setting
     ///         whose share cannot be told.
@@ -55,7 +55,7 @@ class IndexMgr {
 
     // --- Folder settings ------------------------------------------------------------------------
 
-    /// Adds or changes folders, and brings every other party into line: folder.conf is saved, the
+    /// Adds or changes folders, and updates every other party: folder.conf is saved, the
     /// monitor configuration of each touched share rewritten, the daemon's service started,
     /// Spotlight switched on if it was off, "upsert_folder_setting" sent for each folder and a
     /// settings-changed event queued for each.
@@ -72,7 +72,7 @@ class IndexMgr {
     /// Upsert().
     FILEINDEX_API static bool Set(const Json::Value &request);
 
-    /// Removes folders and brings every other party into line. With the last folder the daemon's
+    /// Removes folders and updates every other party. With the last folder the daemon's
     /// service is stopped and Spotlight switched off; otherwise "delete_folder_setting" is sent for
     /// each folder and a settings-changed event queued for the last one that could be resolved. A
     /// share without folders loses its index data and its monitor configuration.
@@ -85,7 +85,7 @@ class IndexMgr {
     ///         an array or an object, is FILEINDEX_ERR_BAD_PARAM and changes nothing.
     FILEINDEX_API static bool Delete(const Json::Value &request);
 
-    /// Queues folders for a new index and revives those of their shares that ran out of space.
+    /// Queues folders for re-indexing and revives those of their shares that ran out of space.
     /// Takes no lock of its own. Reads folder.conf once for each share, and status.conf and the
     /// share's queue once for each path.
     ///
@@ -145,18 +145,18 @@ class IndexMgr {
     /// configuration. Takes no lock and leaves the status file alone.
     ///
     /// @return false when the daemon cannot be reached (nothing is logged or done), or the
-    ///         configuration not be removed.
+    ///         configuration cannot be removed.
     FILEINDEX_API static bool SharePause(const std::string &share);
 
     /// Rewrites the share's monitor configuration from the settings, then asks the daemon to start
     /// its worker ("revive_share_worker"). Takes no lock and leaves the status file alone.
     ///
-    /// @return false when the configuration cannot be written, or the daemon not be reached
-    ///         (nothing is logged).
+    /// @return false when the configuration cannot be written, or the daemon cannot be
+    ///         reached (nothing is logged).
     FILEINDEX_API static bool ShareResume(const std::string &share);
 
     /// Deletes the share's event queue, the queue that the daemon took over, and the index
-    /// database. What is missing or cannot be removed is no failure.
+    /// database. It is no failure when one of them is missing or cannot be removed.
     ///
     /// @return false when the share is unknown.
     FILEINDEX_API static bool CleanShareIndexData(const std::string &share);

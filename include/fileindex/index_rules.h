@@ -22,11 +22,12 @@ FILEINDEX_API bool CanShareBeIndexed(_tag_VANOSHARE *share);
 
 /// @param fileName a single name, not a path.
 /// @return whether the name is reserved by the system: a hidden metadata directory of the platform,
-///         the library's own per-share names, or a desktop's droppings.
+///         the library's own per-share names, or a file that desktops leave behind.
 FILEINDEX_API bool IsSystemPreservedFileName(const std::string &fileName);
 
-/// Whether a file must be left out of the index: a reserved name, something in a recycle bin or a
-/// snapshot, a remote, image or user-space file system. An unknown file system is not left out.
+/// Whether a file must be left out of the index: because of a reserved name, because it lies in a
+/// recycle bin or a snapshot, or on a remote, image or user-space file system. A file system of an
+/// unknown type is no reason.
 ///
 /// @param fullPath absolute file-system path.
 /// @return true to leave it out.
@@ -37,12 +38,12 @@ FILEINDEX_API bool IsSkipIndex(const std::string &fullPath);
 ///         enough.
 FILEINDEX_API bool IsShareSpaceEnough(const std::string &shareName);
 
-/// Whether a folder may be indexed: on a local, known file system, in a share that may be indexed,
-/// outside recycle bins and snapshots, no mount point of its own and without symbolic links or
-/// other detours in its path.
+/// Whether a folder may be indexed: it lies on a local file system of a known type, in a share that
+/// may be indexed, outside recycle bins and snapshots; it is no mount point of its own; its path is
+/// canonical.
 ///
 /// A path in no share is logged twice and sets FILEINDEX_ERR_PATH; an unknown share, a mount point
-/// and a path with detours are logged once; every other refusal is silent.
+/// and a path that is not canonical are logged once; every other refusal is silent.
 ///
 /// @param fullPath absolute file-system path.
 FILEINDEX_API bool CanFullPathBeIndexed(const std::string &fullPath);

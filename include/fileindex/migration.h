@@ -5,9 +5,9 @@
 
 namespace VANO::FILEINDEX {
 
-/// Brings the services into line with the folder settings of the previous release: without folders
-/// the daemon's service is stopped; otherwise it is started, Spotlight switched on, every share
-/// with folders watched by the change monitor and every folder queued for a new index. Changes no
+/// Applies the folder settings of the previous release to the services: without folders the
+/// daemon's service is stopped; otherwise it is started, Spotlight is switched on, the change
+/// monitor watches every share with folders, and every folder is queued for re-indexing. Changes no
 /// settings file; running it again does all of it again.
 ///
 /// @return false at the first failing step, which is logged; what was done before stays.

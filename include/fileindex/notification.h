@@ -5,7 +5,7 @@
 
 namespace VANO::FILEINDEX {
 
-/// Tells the administrators that a share ran out of room for its index, through the system's
+/// Tells the administrators that a share ran out of space for its index, through the system's
 /// notification tool; returns when the tool has ended.
 ///
 /// @return whether the tool ran and reported success. Nothing is logged.
