@@ -10,7 +10,7 @@
 #include <unistd.h>
 
 #include "bench/input.h"
-#include "config/paths.h"
+#include "core/paths.h"
 
 namespace VANO::BENCH {
 

@@ -4,7 +4,7 @@
 #include <cstdio>
 #include <stdexcept>
 
-#include "utils/event_codes.h"
+#include "core/event.h"
 
 namespace VANO::BENCH {
 

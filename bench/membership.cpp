@@ -15,7 +15,7 @@
 #include "bench/appliance.h"
 #include "bench/input.h"
 #include "bench/measure.h"
-#include "config/paths.h"
+#include "core/paths.h"
 
 namespace VANO::BENCH {
 

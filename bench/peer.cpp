@@ -11,7 +11,7 @@
 #include <unistd.h>
 
 #include "base/unique_fd.h"
-#include "config/paths.h"
+#include "core/paths.h"
 
 namespace VANO::BENCH {
 

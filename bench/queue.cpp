@@ -21,7 +21,7 @@
 #include "bench/appliance.h"
 #include "bench/input.h"
 #include "bench/measure.h"
-#include "utils/event_codes.h"
+#include "core/event.h"
 
 namespace VANO::BENCH {
 

@@ -12,7 +12,7 @@
 #include "bench/appliance.h"
 #include "bench/input.h"
 #include "bench/peer.h"
-#include "utils/event_codes.h"
+#include "core/event.h"
 
 using namespace VANO::BENCH;
 

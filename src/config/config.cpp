@@ -9,7 +9,7 @@
 
 #include "base/json_io.h"
 #include "base/log.h"
-#include "config/lock_retry.h"
+#include "core/lock_retry.h"
 
 int LOG_LEVEL = 3;
 

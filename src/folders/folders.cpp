@@ -7,8 +7,8 @@
 
 #include "base/json_io.h"
 #include "base/log.h"
-#include "config/paths.h"
-#include "utils/governing_folder.h"
+#include "core/folder_cover.h"
+#include "core/paths.h"
 
 namespace VANO::FILEINDEX {
 

@@ -3,16 +3,15 @@
 #include <fileindex/share_path.h>
 
 #include "base/log.h"
-#include "config/paths.h"
-#include "index_mgr/unit.h"
+#include "core/paths.h"
+#include "index_mgr/parts.h"
 #include "platform/monitor_queue.h"
-#include "utils/share_location.h"
+#include "utils/index_location.h"
 
 namespace VANO::FILEINDEX {
 
 namespace {
 
-constexpr char kConsumer[] = "fileindex";
 constexpr auto kQueueType = static_cast<VANOTIFYD::_tag_monitor_queue_type_>(1);
 // inotify's event bits from 0x2 to 0x8000 without "closed unwritten" (0x10) and "opened" (0x20).
 constexpr int kWatchedEvents = 0xffce;
@@ -45,7 +44,7 @@ bool IndexMgr::UpsertVANotifydCfg(const std::string &share) {
         entry["mask"] = kWatchedEvents;
         entry["ignore"] = ignore;
     }
-    if (!VANOTIFYD::MonitorQueue::Upsert(VANOTIFYD::MonitorQueue(description), kConsumer,
+    if (!VANOTIFYD::MonitorQueue::Upsert(VANOTIFYD::MonitorQueue(description), kMonitorConsumer,
                                          kQueueType)) {
         LogError(kIndexMgrUnit, __LINE__, "MonitorQueue::Add failed");
         return false;
@@ -58,7 +57,7 @@ bool IndexMgr::DeleteVANotifydCfg(const std::string &share) {
     if (!GetQueueLocation(queue, share, kIndexMgrUnit, __LINE__)) {
         return false;
     }
-    if (!VANOTIFYD::MonitorQueue::Delete(queue, kConsumer, kQueueType)) {
+    if (!VANOTIFYD::MonitorQueue::Delete(queue, kMonitorConsumer, kQueueType)) {
         LogError(kIndexMgrUnit, __LINE__, "MonitorQueue::Delete failed");
         return false;
     }

@@ -11,10 +11,8 @@
 #include "base/json_io.h"
 #include "base/log.h"
 #include "config/settings_lock.h"
-#include "index_mgr/membership.h"
-#include "index_mgr/services.h"
-#include "index_mgr/unit.h"
-#include "utils/event_codes.h"
+#include "core/event.h"
+#include "index_mgr/parts.h"
 
 namespace VANO::FILEINDEX {
 

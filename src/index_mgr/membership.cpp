@@ -7,10 +7,8 @@
 
 #include "base/log.h"
 #include "base/no_throw.h"
-#include "folders/full_path_of.h"
-#include "index_mgr/membership.h"
-#include "index_mgr/unit.h"
-#include "utils/contains.h"
+#include "core/folder_cover.h"
+#include "index_mgr/parts.h"
 
 namespace VANO::FILEINDEX {
 

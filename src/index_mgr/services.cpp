@@ -1,9 +1,7 @@
-#include "index_mgr/services.h"
-
-#include "index_mgr/unit.h"
+#include "core/paths.h"
+#include "index_mgr/parts.h"
 #include "platform/vano_platform.h"
 #include "utils/platform_error.h"
-#include "utils/service_names.h"
 
 namespace VANO::FILEINDEX {
 

@@ -1,16 +1,16 @@
+#include <cerrno>
 #include <fileindex/daemon_socket.h>
 #include <fileindex/folders.h>
 #include <fileindex/index_mgr.h>
 #include <fileindex/share_path.h>
 
 #include "base/log.h"
-#include "config/paths.h"
 #include "config/settings_lock.h"
-#include "index_mgr/services.h"
-#include "index_mgr/unit.h"
+#include "core/paths.h"
+#include "core/share_files.h"
+#include "index_mgr/parts.h"
 #include "platform/vano_platform.h"
-#include "utils/metadata_entry.h"
-#include "utils/share_location.h"
+#include "utils/index_location.h"
 
 namespace VANO::FILEINDEX {
 
@@ -22,12 +22,14 @@ bool SendShareCommand(const char *command, const std::string &share) {
     return SendCammandToDaemon(command, parameters);
 }
 
-// What cannot be removed stays; that is no failure. Behind a symbolic link lies another share's
-// data, or worse.
+// What cannot be removed stays; that is no failure. A metadata directory that is a symbolic link,
+// or cannot be looked at, may lead to another share's data, or worse. One that is missing is no
+// obstacle.
 void RemoveRecursively(const std::string &path) {
-    if (MetadataEntry(path).IsObstructed()) {
-        LogError(kIndexMgrUnit, __LINE__, "Refused to remove, not in the share, path=%s",
-                 path.c_str());
+    errno = ShareFile(path).Failure();
+    if (errno != 0 && errno != ENOENT) {
+        LogError(kIndexMgrUnit, __LINE__, "Refused to remove, path=%s, reason=%s", path.c_str(),
+                 ErrnoText().c_str());
         return;
     }
     const char *const end = nullptr;

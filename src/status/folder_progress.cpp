@@ -5,11 +5,11 @@
 #include <fileindex/status_mgr.h>
 
 #include "base/log.h"
-#include "config/paths.h"
-#include "status/progress_names.h"
-#include "utils/event_codes.h"
-#include "utils/queue_reader.h"
-#include "utils/share_location.h"
+#include "core/event.h"
+#include "core/progress_words.h"
+#include "core/queue_reader.h"
+#include "core/share_files.h"
+#include "utils/index_location.h"
 
 namespace VANO::FILEINDEX {
 
@@ -18,21 +18,20 @@ namespace {
 constexpr char kUnit[] = "status_mgr";
 
 // Reads the whole queue, so that each malformed line in it is logged; true when there was none.
-bool AddEvents(PendingFolders &folders, QueueReader &reader) {
+//
+// The former path of a move stands for every later event too, whatever its code: what it reaches,
+// the move itself has reached.
+bool CountEvents(EventCounts &counts, const FolderSet &folders, QueueReader &reader) {
     bool silent = true;
+    EventParser parser;
     std::string_view line;
     QueueEvent event{};
     while (reader.NextLine(line)) {
-        if (!reader.ParseEvent(event, line)) {
+        if (parser.Parse(event, line)) {
+            folders.Count(counts, event);
+        } else {
             LogError(kUnit, 47, "Malformed command: %s", std::string(line).c_str());
             silent = false;
-            continue;
-        }
-        folders.AddEvent(event.path);
-        // The former path of a move stands for every later event too, whatever its code: what it
-        // reaches, the move itself has reached.
-        if (event.code == kEventMoved) {
-            folders.AddEvent(event.formerPath);
         }
     }
     return silent;
@@ -41,23 +40,28 @@ bool AddEvents(PendingFolders &folders, QueueReader &reader) {
 } // namespace
 
 // Whether the queue holds an event at or under the folder.
-bool FolderProgress::Scan(QueueReader &reader, const std::string &folder,
-                          const std::string &queueFile) {
-    const auto [scan, isFirst] = scans_.try_emplace(queueFile);
+bool FolderProgress::ScanQueue(const ShareFile &queue, const std::string &folder) {
+    QueueReader reader(queue);
+    if (!reader.IsOpen()) {
+        LogError(kUnit, 37, "Failed to open queue=%s, reason=%s", queue.Path().c_str(),
+                 ErrnoText().c_str());
+        return false;
+    }
+    const auto [known, isFirst] = scans_.try_emplace(queue.Path());
     std::vector<std::string> wanted = isFirst ? fullPaths_ : std::vector<std::string>();
     wanted.push_back(folder);
-    PendingFolders folders(std::move(wanted));
-    const bool silent = AddEvents(folders, reader);
-    const bool found = folders.IsPending(folder);
+    Scan scan{FolderSet(std::move(wanted)), {}};
+    const bool silent = CountEvents(scan.counts, scan.folders, reader);
+    const bool found = scan.counts.Of(scan.folders.Find(folder)) != 0;
     if (isFirst && silent) {
-        scan->second = std::move(folders);
+        known->second = std::move(scan);
     }
     return found;
 }
 
 // The same for a folder by its share path and a queue that need not exist.
-bool FolderProgress::IsPathInQueue(const std::string &path, const std::string &queueFile) {
-    if (!IsFileExist(queueFile)) {
+bool FolderProgress::IsPathInQueue(const std::string &path, const ShareFile &queue) {
+    if (!queue.IsFile()) {
         return false;
     }
     std::string folder;
@@ -65,41 +69,39 @@ bool FolderProgress::IsPathInQueue(const std::string &path, const std::string &q
         LogError(kUnit, 30, "Cannot get full path: %s", path.c_str());
         return false;
     }
-    const auto known = scans_.find(queueFile);
-    if (known != scans_.end() && known->second && known->second->Holds(folder)) {
-        return known->second->IsPending(folder);
+    const auto known = scans_.find(queue.Path());
+    if (known != scans_.end() && known->second) {
+        const std::size_t place = known->second->folders.Find(folder);
+        if (place != FolderSet::kNone) {
+            return known->second->counts.Of(place) != 0;
+        }
     }
-    QueueReader reader(queueFile);
-    if (!reader.IsOpen()) {
-        LogError(kUnit, 37, "Failed to open queue=%s, reason=%s", queueFile.c_str(),
-                 ErrnoText().c_str());
-        return false;
-    }
-    return Scan(reader, folder, queueFile);
+    return ScanQueue(queue, folder);
 }
 
 std::string FolderProgress::StatusOf(const std::string &path) {
     if (!CanPathBeIndexed(path)) {
-        return kPaused;
+        return kProgressPaused;
     }
     std::string share;
     if (!GetShareNameByPath(share, path)) {
         LogError(kUnit, 88, "Failed to get share name from path: %s", path.c_str());
-        return kFinished;
+        return kProgressFinished;
     }
     if (StatusMgr::ShareIsNoSpace(share)) {
-        return kNoSpace;
+        return kProgressNoSpace;
     }
-    std::string queue;
-    if (!GetQueueLocation(queue, share, kUnit, 100)) {
-        return kFinished;
+    std::string location;
+    if (!GetQueueLocation(location, share, kUnit, 100)) {
+        return kProgressFinished;
     }
     long long resumeTime = kNotPaused;
     (void)StatusMgr::GetPauseInfo(resumeTime); // a pause that cannot be read is none
-    if (!IsPathInQueue(path, queue) && !IsPathInQueue(path, queue + kTakenQueueSuffix)) {
-        return kFinished;
+    const ShareFile queue(location);
+    if (!IsPathInQueue(path, queue) && !IsPathInQueue(path, queue.TakenOver())) {
+        return kProgressFinished;
     }
-    return WaitingStatus(resumeTime);
+    return WaitingProgress(resumeTime, ::time(nullptr));
 }
 
 } // namespace VANO::FILEINDEX

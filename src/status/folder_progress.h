@@ -6,11 +6,11 @@
 #include <string>
 #include <vector>
 
-#include "status/pending_folders.h"
+#include "core/folder_set.h"
 
 namespace VANO::FILEINDEX {
 
-class QueueReader;
+class ShareFile;
 
 // How far folders are indexed, asked one after another within one call of the library.
 //
@@ -26,13 +26,17 @@ class FolderProgress {
     [[nodiscard]] std::string StatusOf(const std::string &path);
 
   private:
-    [[nodiscard]] bool IsPathInQueue(const std::string &path, const std::string &queueFile);
-    [[nodiscard]] bool Scan(QueueReader &reader, const std::string &folder,
-                            const std::string &queueFile);
+    // What the scan of a queue found.
+    struct Scan {
+        FolderSet folders;
+        EventCounts counts;
+    };
+
+    [[nodiscard]] bool IsPathInQueue(const std::string &path, const ShareFile &queue);
+    [[nodiscard]] bool ScanQueue(const ShareFile &queue, const std::string &folder);
 
     std::vector<std::string> fullPaths_;
-    // What the first scan of a queue file found; nothing when it logged.
-    std::map<std::string, std::optional<PendingFolders>> scans_;
+    std::map<std::string, std::optional<Scan>> scans_; // the first of a queue, unless it logged
 };
 
 } // namespace VANO::FILEINDEX

@@ -6,10 +6,10 @@
 #include <set>
 
 #include "base/log.h"
-#include "config/paths.h"
+#include "core/progress_words.h"
+#include "core/share_files.h"
 #include "status/folder_progress.h"
-#include "status/progress_names.h"
-#include "utils/share_location.h"
+#include "utils/index_location.h"
 
 namespace VANO::FILEINDEX {
 
@@ -47,24 +47,25 @@ bool StatusMgr::GetStatus(std::string &status) {
     }
     bool waiting = false;
     for (const std::string &share : shares) {
-        std::string queue;
-        if (!GetQueueLocation(queue, share, kUnit, 146)) {
+        std::string location;
+        if (!GetQueueLocation(location, share, kUnit, 146)) {
             return false;
         }
-        if (IsFileExist(queue) || IsFileExist(queue + kTakenQueueSuffix)) {
+        const ShareFile queue(location);
+        if (queue.IsFile() || queue.TakenOver().IsFile()) {
             waiting = true;
             break;
         }
     }
     if (!waiting) {
-        status = kFinished;
+        status = kProgressFinished;
         return true;
     }
     long long resumeTime = kNotPaused;
     if (!GetPauseInfo(resumeTime)) {
         return false;
     }
-    status = WaitingStatus(resumeTime);
+    status = WaitingProgress(resumeTime, ::time(nullptr));
     return true;
 }
 

@@ -3,8 +3,8 @@
 #include <fileindex/notification.h>
 
 #include "base/log.h"
-#include "config/paths.h"
-#include "status/resume_time.h"
+#include "core/paths.h"
+#include "core/progress_words.h"
 
 namespace VANO::FILEINDEX {
 

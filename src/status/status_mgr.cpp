@@ -8,7 +8,7 @@
 
 #include "base/log.h"
 #include "config/settings_lock.h"
-#include "status/resume_time.h"
+#include "core/progress_words.h"
 
 namespace VANO::FILEINDEX {
 

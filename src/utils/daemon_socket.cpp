@@ -12,7 +12,7 @@
 
 #include "base/json_io.h"
 #include "base/unique_fd.h"
-#include "config/paths.h"
+#include "core/paths.h"
 
 namespace VANO::FILEINDEX {
 

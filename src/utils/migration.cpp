@@ -6,9 +6,9 @@
 #include <set>
 
 #include "base/log.h"
+#include "core/paths.h"
 #include "platform/vano_platform.h"
 #include "utils/platform_error.h"
-#include "utils/service_names.h"
 
 namespace VANO::FILEINDEX {
 

@@ -1,6 +1,6 @@
 #include <fileindex/notification.h>
 
-#include "config/paths.h"
+#include "core/paths.h"
 #include "platform/vano_platform.h"
 
 namespace VANO::FILEINDEX {

@@ -7,8 +7,7 @@
 #include <utility>
 
 #include "base/log.h"
-#include "utils/share_of_full_path.h"
-#include "utils/share_record.h"
+#include "core/share.h"
 
 namespace VANO::FILEINDEX {
 
@@ -68,14 +67,14 @@ bool GetFullPath(std::string &fullPath, const std::string &sharePath) {
 }
 
 bool GetShareNamePathByFullPath(std::string &name, std::string &path, const std::string &fullPath) {
-    ShareOfFullPath found;
-    if (!FindShareOfFullPath(found, fullPath)) {
+    auto found = FindShareOfFullPath(fullPath);
+    if (!found) {
         LogError(kUnit, 418, "VANOShareNamePathGet failed, path=%s", fullPath.c_str());
         ErrorHandler::SetError(FILEINDEX_ERR_PATH);
         return false;
     }
-    name = found.name.data();
-    path = found.path.data();
+    name = std::move(found->name);
+    path = std::move(found->path);
     return true;
 }
 

@@ -8,6 +8,7 @@ namespace VANO::TESTS {
 
 namespace {
 
+using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::ElementsAreArray;
 using ::testing::IsEmpty;
@@ -488,19 +489,36 @@ TEST_F(CleanShareIndexDataTest, AnUnknownShareIsAnErrorAndNothingIsRemoved) {
     EXPECT_THAT(Steps(), IsEmpty());
 }
 
-// Cut, the location is the share itself or something in it.
-TEST_F(CleanShareIndexDataTest, ALocationThatWouldBeCutIsNotRemoved) {
+// A directory of that many bytes, which need not exist.
+std::string LongDirectory(std::size_t size) {
     std::string directory = "/volume1";
-    while (directory.size() < 4095 - 200) {
+    while (directory.size() < size - 200) {
         directory += "/" + std::string(180, 'd');
     }
-    directory += "/" + std::string(4094 - directory.size(), 'd');
+    return directory + "/" + std::string(size - directory.size() - 1, 'd');
+}
+
+// Cut, the location is the share itself or something in it.
+TEST_F(CleanShareIndexDataTest, ALocationThatWouldBeCutIsNotRemoved) {
+    const std::size_t rest = QueueOf("").size();
+    for (const std::size_t size : {4096 - rest, std::size_t{4095}}) {
+        platform.AddShare("deep", LongDirectory(size));
+        platform.AnswerAlways("VANOEAMKDir", 0);
+        Watch();
+        EXPECT_FALSE(IndexMgr::CleanShareIndexData("deep"));
+        ExpectLog({"index_mgr:* FILEIDXQueuePathGet failed, share=deep"});
+        EXPECT_EQ(platform.Calls("VLIBCExec"), 0U);
+    }
+}
+
+TEST_F(CleanShareIndexDataTest, ALocationOfTheLongestPathIsRemoved) {
+    const std::string directory = LongDirectory(4095 - QueueOf("").size());
     platform.AddShare("deep", directory);
     platform.AnswerAlways("VANOEAMKDir", 0);
     Watch();
-    EXPECT_FALSE(IndexMgr::CleanShareIndexData("deep"));
-    ExpectLog({"index_mgr:* FILEIDXQueuePathGet failed, share=deep"});
-    EXPECT_EQ(platform.Calls("VLIBCExec"), 0U);
+    EXPECT_TRUE(IndexMgr::CleanShareIndexData("deep"));
+    EXPECT_THAT(Steps(), Contains(Removed(QueueOf(directory))));
+    (void)SystemLog::Get().Lines(); // no database can be made there
 }
 
 TEST_F(CleanShareIndexDataTest, ANameWithAZeroByteIsNoShares) {

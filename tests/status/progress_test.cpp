@@ -154,19 +154,27 @@ TEST_F(ProgressTest, AnUnknownQueueLocationReadsAsFinished) {
                "status_mgr:100 FILEIDXQueuePathGet failed, share=photos"});
 }
 
-// What fills the buffer may be the beginning of another path.
+// A path that had to be cut would be the beginning of another one.
 TEST_F(ProgressTest, AQueueLocationThatIsTooLongReadsAsFinished) {
     PutFile(kQueue, kWaiting);
     platform.AnswerAlways("VANOEAMKDir", 0);
-    int asked = 0;
-    platform.On("VANOShareGet", [&](const std::string &) -> std::optional<int> {
-        if (++asked == 3) { // for the location
-            platform.FindShare("photos")->path = "/volume1/" + std::string(4080, 'x');
+    const std::size_t rest = std::string("/volume1//@eaDir/VANO@file_index_queue").size();
+    for (const std::size_t size : {4095U, 4096U}) {
+        SCOPED_TRACE(size);
+        int asked = 0;
+        platform.On("VANOShareGet", [&](const std::string &) {
+            const bool isForLocation = ++asked == 3;
+            platform.FindShare("photos")->path =
+                "/volume1/" + (isForLocation ? std::string(size - rest, 'x') : "photos");
+            return std::optional<int>();
+        });
+        EXPECT_EQ(StatusOf(), "finished");
+        std::vector<std::string> lines;
+        if (size == 4096) {
+            lines = {"status_mgr:100 FILEIDXQueuePathGet failed, share=photos"};
         }
-        return std::nullopt;
-    });
-    EXPECT_EQ(StatusOf(), "finished");
-    ExpectLog({"status_mgr:100 FILEIDXQueuePathGet failed, share=photos"});
+        ExpectLog(lines);
+    }
 }
 
 TEST_F(ProgressTest, AFolderThatNoLongerResolvesIsInNoQueue) {
@@ -454,8 +462,8 @@ TEST_F(ProgressTest, AskingTakesNoLockAndChangesNothing) {
     EXPECT_THAT(Effects(), ElementsAre("VANOEAMKDir(0, /volume1/photos/@eaDir)"));
 }
 
-TEST_F(ProgressTest, AVeryLongLineIsAnEventToo) {
-    const std::string data(std::size_t{10} << 20, 'x');
+TEST_F(ProgressTest, ALongLineIsAnEventToo) {
+    const std::string data((std::size_t{1} << 20) - 100, 'x');
     PutFile(kQueue, R"({"event":1,"path":"/volume1/photos/trip","data":")" + data + "\"}\n");
     EXPECT_EQ(StatusOf(), "processing");
     ExpectLog({});

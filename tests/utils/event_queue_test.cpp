@@ -148,7 +148,6 @@ TEST_F(EventQueueTest, WritesOnceUnderTheLock) {
         platform.Trace(),
         ElementsAre("VANOShareNamePathGet(/volume1/photos/trip, 492, 4096)", "VANOShareGet(photos)",
                     "VANOEAMKDir(0, /volume1/photos/@eaDir)", "VANOShareFree(photos)",
-                    "close(/volume1/photos)", // after the way to the queue was looked at
                     StartsWith("open(" + queue + ", "),
                     "flock(" + queue + ", " + std::to_string(LOCK_EX | LOCK_NB) + ")",
                     "write(" + queue + ", " + std::to_string(std::string(kTripLine).size()) + ")",
@@ -608,10 +607,34 @@ TEST_F(EventQueueTest, AWholeWriteIsNoNews) {
     ExpectLog({});
 }
 
-TEST_F(EventQueueTest, AVeryLongEventIsOneLine) {
-    const Json::Value data = std::string(std::size_t{4} << 20, 'x');
-    EXPECT_TRUE(AddCustomEvent(kSettingChanged, kTrip, data));
-    EXPECT_EQ(ReadJson(kQueue)["data"], data);
+// A longer line would be malformed to whoever reads it.
+TEST_F(EventQueueTest, AnEventBeyondAMebibyteMarksTheShare) {
+    const std::size_t frame = std::string(kTripLine).size() - 1; // with "{}" as long as two quotes
+    const std::string most((std::size_t{1} << 20) - frame, 'x');
+    EXPECT_TRUE(AddCustomEvent(kSettingChanged, kTrip, most));
+    EXPECT_EQ(ReadText(kQueue).size(), (std::size_t{1} << 20) + 1);
+    EXPECT_EQ(ReadJson(kQueue)["data"], most);
+    ExpectNoMark();
+    EXPECT_FALSE(AddCustomEvent(kSettingChanged, kTrip, most + "x"));
+    EXPECT_EQ(ReadText(kQueue).size(), (std::size_t{1} << 20) + 1);
+    ExpectMark("photos");
+    ExpectLog({});
+}
+
+TEST_F(EventQueueTest, ALongEventThatIsCoveredIsNoMark) {
+    PutFile(kQueue, PendingRows()[0].line + "\n");
+    EXPECT_TRUE(AddCustomEvent(kSettingChanged, kTrip, std::string(std::size_t{2} << 20, 'x')));
+    ExpectNoMark();
+}
+
+TEST_F(EventQueueTest, ALineBeyondAMebibyteCoversNothing) {
+    const std::string line = PendingRows()[0].line;
+    PutFile(kQueue, line + std::string((std::size_t{1} << 20) - line.size(), ' ') + "\n");
+    EXPECT_TRUE(AddTrip());
+    EXPECT_EQ(ReadText(kQueue).size(), (std::size_t{1} << 20) + 1);
+    PutFile(kQueue, line + std::string((std::size_t{1} << 20) - line.size() + 1, ' ') + "\n");
+    EXPECT_TRUE(AddTrip());
+    EXPECT_GT(ReadText(kQueue).size(), (std::size_t{1} << 20) + 2);
 }
 
 // --- what stands in the queue's place -------------------------------------------------------
@@ -728,6 +751,32 @@ TEST_F(EventQueueTest, AQueueThatIsTakenOverThreeTimesMarksTheShare) {
     EXPECT_FALSE(Exists(kQueue));
     ExpectMark("photos");
     ExpectLog({});
+}
+
+TEST_F(EventQueueTest, BusyLocksAmongTakeoversMarkTheShare) {
+    for (int busy = 0; busy < 3; ++busy) { // at that attempt; the queue is taken over at the others
+        SCOPED_TRACE(busy);
+        RemoveTree(kStatusFile);
+        Fault::Reset();
+        Fault::Quiet(Call::Usleep);
+        LOG_LEVEL = 7;
+        Fault::On(Call::Flock, [busy, attempt = 0](CallInfo &info) mutable -> std::optional<long> {
+            if (info.path != kQueue || (info.number & LOCK_EX) == 0) {
+                return std::nullopt;
+            }
+            if (attempt++ == busy) {
+                errno = EAGAIN;
+                return -1;
+            }
+            EXPECT_EQ(::rename(kQueue, kTaken), 0);
+            return std::nullopt;
+        });
+        EXPECT_FALSE(AddTrip());
+        EXPECT_EQ(Fault::Calls(Call::Usleep), 1U);
+        ExpectMark("photos");
+        ExpectLog({});
+        RemoveTree(kQueue);
+    }
 }
 
 TEST_F(EventQueueTest, AFileBelowTheMetadataDirectoryIsNoQueueDirectory) {

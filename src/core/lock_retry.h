@@ -1,11 +1,11 @@
-#ifndef FILEINDEX_CONFIG_LOCK_RETRY_H
-#define FILEINDEX_CONFIG_LOCK_RETRY_H
+#ifndef FILEINDEX_CORE_LOCK_RETRY_H
+#define FILEINDEX_CORE_LOCK_RETRY_H
 
 #include <cerrno>
 #include <cstdlib>
 #include <unistd.h>
 
-// The one rule by which every lock of the library is retried.
+// The one rule by which every lock is retried.
 
 namespace VANO::FILEINDEX {
 

@@ -1,4 +1,4 @@
-#include "utils/queue_reader.h"
+#include "core/queue_reader.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -6,26 +6,18 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "utils/metadata_entry.h"
+#include "core/event.h"
+#include "core/share_files.h"
 
 namespace VANO::FILEINDEX {
 
 namespace {
 
-// Far beyond any event. What is longer comes from a file that is no queue, and is cut.
-constexpr std::size_t kMaxLineBytes = kMaxJsonFileBytes;
 // Ends a line that was cut: no JSON object ends so.
 constexpr std::string_view kCutMark = "...";
 
 constexpr std::size_t kFirstBufferBytes = std::size_t{64} * 1024;
-constexpr std::size_t kMaxBufferBytes = kMaxLineBytes + 1; // one more tells that a line is longer
-
-std::string_view TextOf(const Json::Value &string) {
-    const char *begin = nullptr;
-    const char *end = nullptr;
-    (void)string.getString(&begin, &end);
-    return {begin, static_cast<std::size_t>(end - begin)};
-}
+constexpr std::size_t kMaxBufferBytes = kMaxEventBytes + 1; // one more tells that a line is longer
 
 // With room for the mark.
 std::unique_ptr<char[]> MakeBuffer(std::size_t size) {
@@ -34,9 +26,7 @@ std::unique_ptr<char[]> MakeBuffer(std::size_t size) {
 
 } // namespace
 
-QueueReader::QueueReader(const std::string &path) : QueueReader(MetadataEntry(path)) {}
-
-QueueReader::QueueReader(const MetadataEntry &queue) : file_(queue.Open(O_RDONLY)) {
+QueueReader::QueueReader(const ShareFile &queue) : file_(queue.Open(O_RDONLY)) {
     struct stat info {};
     if (file_ && (::fstat(file_.Get(), &info) != 0 || !S_ISREG(info.st_mode))) {
         file_ = UniqueFd();
@@ -72,10 +62,10 @@ bool QueueReader::Fill() {
 // read yet.
 std::string_view QueueReader::CutLine() {
     char *const line = buffer_.get() + begin_;
-    kCutMark.copy(line + kMaxLineBytes, kCutMark.size());
+    kCutMark.copy(line + kMaxEventBytes, kCutMark.size());
     begin_ = end_;
     cut_ = true;
-    return {line, kMaxLineBytes + kCutMark.size()};
+    return {line, kMaxEventBytes + kCutMark.size()};
 }
 
 void QueueReader::SkipRestOfCutLine() {
@@ -91,7 +81,7 @@ bool QueueReader::NextLine(std::string_view &line) {
     std::size_t newline = Rest().find('\n');
     while (newline == std::string_view::npos) {
         const std::size_t searched = Rest().size();
-        if (searched > kMaxLineBytes) {
+        if (searched > kMaxEventBytes) {
             line = CutLine();
             return true;
         }
@@ -104,30 +94,6 @@ bool QueueReader::NextLine(std::string_view &line) {
     }
     line = Rest().substr(0, newline);
     begin_ += newline + 1;
-    return true;
-}
-
-bool QueueReader::ParseEvent(QueueEvent &event, std::string_view line) {
-    return ReadPlainEvent(event, line) || ReadEventWithLibrary(event, line);
-}
-
-// Decides every line that is not plain.
-bool QueueReader::ReadEventWithLibrary(QueueEvent &event, std::string_view line) {
-    if (!parser_.ParseWithLibrary(parsed_, line) || !parsed_.isObject()) {
-        return false;
-    }
-    const Json::Value &object = parsed_;
-    const Json::Value &path = object["path"];
-    const Json::Value &formerPath = object["path_old"];
-    if (!object.isMember("event") || !object["event"].isConvertibleTo(Json::uintValue) ||
-        !path.isString()) {
-        return false;
-    }
-    event.code = object["event"].asUInt();
-    event.path = TextOf(path);
-    formerPath_ =
-        formerPath.isConvertibleTo(Json::stringValue) ? formerPath.asString() : std::string();
-    event.formerPath = formerPath_;
     return true;
 }
 

@@ -1,7 +1,20 @@
-#ifndef FILEINDEX_INDEX_MGR_SERVICES_H
-#define FILEINDEX_INDEX_MGR_SERVICES_H
+#ifndef FILEINDEX_INDEX_MGR_PARTS_H
+#define FILEINDEX_INDEX_MGR_PARTS_H
+
+#include <fileindex/folder.h>
+#include <string>
+#include <vector>
+
+// What the files of IndexMgr share.
 
 namespace VANO::FILEINDEX {
+
+// The unit that messages of IndexMgr's operations name, whichever file they stand in.
+constexpr char kIndexMgrUnit[] = "index_mgr";
+
+// Whether one of the folders lies in the share. A folder without a share is skipped, with one line
+// logged.
+[[nodiscard]] bool HoldsFolderOfShare(const std::vector<Folder> &folders, const std::string &share);
 
 // Starts the indexing daemon's service. False, with one line logged, when that fails.
 [[nodiscard]] bool StartIndexingService();

@@ -1,4 +1,4 @@
-#include "utils/event_line.h"
+#include "core/event.h"
 
 #include <limits>
 
@@ -69,6 +69,13 @@ struct Draft {
     }
 };
 
+std::string_view TextOf(const Json::Value &string) {
+    const char *begin = nullptr;
+    const char *end = nullptr;
+    (void)string.getString(&begin, &end);
+    return {begin, static_cast<std::size_t>(end - begin)};
+}
+
 } // namespace
 
 bool ReadPlainEvent(QueueEvent &event, std::string_view line) {
@@ -83,7 +90,44 @@ bool ReadPlainEvent(QueueEvent &event, std::string_view line) {
             return false;
         }
     } while (json.Take(','));
+    if (event.code != kEventMoved) {
+        event.formerPath = {};
+    }
     return json.Take('}') && json.AtEnd() && draft.hasCode && draft.hasPath;
+}
+
+bool EventParser::Parse(QueueEvent &event, std::string_view line) {
+    return line.size() <= kMaxEventBytes &&
+           (ReadPlainEvent(event, line) || ParseWithLibrary(event, line));
+}
+
+// Decides every line that is not plain.
+bool EventParser::ParseWithLibrary(QueueEvent &event, std::string_view line) {
+    if (!parser_.ParseWithLibrary(parsed_, line) || !parsed_.isObject()) {
+        return false;
+    }
+    const Json::Value &object = parsed_; // looking a member up must not make it
+    const Json::Value &path = object["path"];
+    const Json::Value &formerPath = object["path_old"];
+    if (!object.isMember("event") || !object["event"].isConvertibleTo(Json::uintValue) ||
+        !path.isString()) {
+        return false;
+    }
+    event.code = object["event"].asUInt();
+    event.path = TextOf(path);
+    const bool isMove = event.code == kEventMoved;
+    formerPath_ = isMove && formerPath.isConvertibleTo(Json::stringValue) ? formerPath.asString()
+                                                                          : std::string();
+    event.formerPath = formerPath_;
+    return true;
+}
+
+std::string EventLine(int code, const std::string &fullPath, const Json::Value &data) {
+    Json::Value object(Json::objectValue);
+    object["event"] = code;
+    object["path"] = fullPath;
+    object["data"] = data;
+    return JsonToString(object) + "\n";
 }
 
 } // namespace VANO::FILEINDEX
