@@ -6,6 +6,7 @@
 #include <fileindex/share_path.h>
 #include <fileindex/status_mgr.h>
 #include <map>
+#include <optional>
 #include <set>
 
 #include "base/json_io.h"
@@ -77,7 +78,7 @@ bool ApplyUpserts(Touched &touched, Folders &settings, const Json::Value &reques
         const Json::Value &element = request[index];
         if (!settings.Upsert(report, element)) {
             LogError(kIndexMgrUnit, __LINE__, "Upsert failed, folder=%s",
-                     JsonToMessageText(element).c_str());
+                     JsonToString(element).c_str());
             return false;
         }
         const std::string path = PathOf(element);
@@ -186,10 +187,24 @@ bool SettleShares(const std::set<std::string> &shares) {
 
 // --- Reindex, step by step ----------------------------------------------------------------------
 
-// Checks every path before anything is done. `fullShares` receives the shares out of space. Whether
-// a share is indexed is asked once: each time folder.conf is read.
+// Asks the settings, which are loaded once, for shares. The answers are those of IsShareIndexed().
+class IndexedShares {
+  public:
+    [[nodiscard]] bool Hold(const std::string &share) {
+        if (!loaded_) {
+            loaded_ = IndexMgr::List(folders_);
+        }
+        return *loaded_ && HoldsFolderOfShare(folders_, share);
+    }
+
+  private:
+    std::optional<bool> loaded_; // whether that went well; nothing before the first question
+    std::vector<Folder> folders_;
+};
+
+// Checks every path before anything is done. `fullShares` receives the shares out of space.
 bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
-    std::set<std::string> checked;
+    IndexedShares indexed;
     // NOLINTNEXTLINE(modernize-loop-convert): an iterator skips holes
     for (Json::ArrayIndex index = 0; index < paths.size(); ++index) {
         const Json::Value &element = paths[index];
@@ -203,7 +218,7 @@ bool CheckReindex(std::set<std::string> &fullShares, const Json::Value &paths) {
                      path.c_str());
             return false;
         }
-        if (checked.insert(share).second && !IndexMgr::IsShareIndexed(share)) {
+        if (!indexed.Hold(share)) {
             return false;
         }
         if (StatusMgr::ShareIsNoSpace(share)) {

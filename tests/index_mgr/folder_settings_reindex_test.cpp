@@ -6,7 +6,9 @@ namespace VANO::TESTS {
 
 namespace {
 
+using ::testing::Contains;
 using ::testing::ElementsAre;
+using ::testing::Field;
 using ::testing::IsEmpty;
 using namespace std::string_literals;
 
@@ -156,6 +158,20 @@ TEST_F(ReindexTest, SettingsThatCannotBeLoadedIndexNothing) {
     EXPECT_FALSE(IndexMgr::Reindex(Paths({"/photos/a"})));
     ExpectLog({"config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf"});
     EXPECT_THAT(EventsIn(QueueOf(kPhotos)), IsEmpty());
+}
+
+TEST_F(ReindexTest, TheSettingsAreLoadedOnceForAllPaths) {
+    Fault::Count(Call::Open);
+    EXPECT_TRUE(IndexMgr::Reindex(Paths({"/photos/a", "/video/c", "/photos/b"})));
+    EXPECT_THAT(Fault::Log(Call::Open), Contains(Field(&CallInfo::path, kFolderFile)).Times(1));
+}
+
+TEST_F(ReindexTest, EachPathIsAskedForWithItsMessages) {
+    PutFile(kFolderFile, R"({"":{},"/photos/a":{},"/photos/b":{}})");
+    EXPECT_TRUE(IndexMgr::Reindex(Paths({"/photos/a", "/photos/b"})));
+    ExpectLog({"utils:389 GetShareNameByPath failed, path=",
+               "index_mgr:* Failed to get share name from path: ",
+               "index_mgr:* Failed to get share name from path: "});
 }
 
 // --- shares out of space ------------------------------------------------------------------------

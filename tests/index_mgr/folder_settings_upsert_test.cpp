@@ -342,7 +342,7 @@ INSTANTIATE_TEST_SUITE_P(
         BadElement{"Text",
                    R"("/photos/x")",
                    {R"(folders:129 Bad param: "/photos/x")",
-                    "index_mgr:* Upsert failed, folder=/photos/x"}},
+                    R"(index_mgr:* Upsert failed, folder="/photos/x")"}},
         // Cut at the zero byte it would be the share photos.
         BadElement{"ZeroByteInTheShareName",
                    R"({"path":"/photos\u0000x/a"})",
