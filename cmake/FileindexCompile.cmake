@@ -32,9 +32,17 @@ function(fileindex_warnings target)
     endif()
 endfunction()
 
-# With a sanitizer optimising takes twice as long, and only the libraries gain by it.
+# What a developer builds again and again, and what nobody waits for while it runs.
 function(fileindex_compile_quickly target)
-    if(FILEINDEX_SANITIZE)
+    if(FILEINDEX_DEVELOPER)
         target_compile_options(${target} PRIVATE -O0)
+    endif()
+endfunction()
+
+# As target_precompile_headers. Packages and sanitized builds do without, and so find the include that
+# a file lacks.
+function(fileindex_precompile target)
+    if(FILEINDEX_DEVELOPER)
+        target_precompile_headers(${target} ${ARGN})
     endif()
 endfunction()
