@@ -6,11 +6,11 @@
 #include <memory>
 #include <unistd.h>
 
-#include "command.h"
-#include "help.h"
-#include "messages.h"
-#include "mistake.h"
-#include "text.h"
+#include "commands/command.h"
+#include "terminal/help.h"
+#include "terminal/messages.h"
+#include "terminal/mistake.h"
+#include "terminal/text.h"
 
 namespace {
 

@@ -1,8 +1,8 @@
-#include "fit.h"
+#include "terminal/fit.h"
 
 #include <gtest/gtest.h>
 
-#include "text.h"
+#include "terminal/text.h"
 
 namespace VANO::TESTS {
 namespace {

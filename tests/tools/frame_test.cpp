@@ -4,7 +4,7 @@
 #include <gmock/gmock.h>
 
 #include "support/files.h"
-#include "text.h"
+#include "terminal/text.h"
 
 namespace VANO::TESTS {
 namespace {

@@ -1,4 +1,4 @@
-#include "status/queue_counter.h"
+#include "state/queue_counter.h"
 
 #include <cerrno>
 #include <cstdio>

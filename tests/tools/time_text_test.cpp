@@ -1,4 +1,4 @@
-#include "time_text.h"
+#include "terminal/times.h"
 
 #include <cstdlib>
 #include <gtest/gtest.h>

@@ -1,4 +1,4 @@
-#include "times.h"
+#include "terminal/times.h"
 
 #include <cstdlib>
 #include <gtest/gtest.h>

@@ -1,8 +1,8 @@
 #ifndef FILEINDEXCTL_DOCTOR_CHECKS_H
 #define FILEINDEXCTL_DOCTOR_CHECKS_H
 
+#include "doctor/evidence.h"
 #include "doctor/finding.h"
-#include "doctor/machine.h"
 
 namespace CTL::DOCTOR {
 
@@ -11,19 +11,19 @@ namespace CTL::DOCTOR {
 struct Check {
     const char *name;
     const char *title;
-    Findings (*look)(const Machine &machine);
+    Findings (*look)(const Evidence &evidence);
 };
 
 // One file each, named as the check.
-Findings CheckSettings(const Machine &machine);
-Findings CheckLocks(const Machine &machine);
-Findings CheckShares(const Machine &machine);
-Findings CheckFolders(const Machine &machine);
-Findings CheckDaemon(const Machine &machine);
-Findings CheckQueues(const Machine &machine);
-Findings CheckMonitor(const Machine &machine);
-Findings CheckSpotlight(const Machine &machine);
-Findings CheckRoom(const Machine &machine);
+Findings CheckSettings(const Evidence &evidence);
+Findings CheckLocks(const Evidence &evidence);
+Findings CheckShares(const Evidence &evidence);
+Findings CheckFolders(const Evidence &evidence);
+Findings CheckDaemon(const Evidence &evidence);
+Findings CheckQueues(const Evidence &evidence);
+Findings CheckMonitor(const Evidence &evidence);
+Findings CheckSpotlight(const Evidence &evidence);
+Findings CheckRoom(const Evidence &evidence);
 
 } // namespace CTL::DOCTOR
 

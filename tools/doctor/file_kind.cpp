@@ -6,7 +6,7 @@
 #include <filesystem>
 #include <set>
 
-#include "text.h"
+#include "terminal/text.h"
 
 namespace CTL::DOCTOR {
 

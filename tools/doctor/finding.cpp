@@ -6,7 +6,7 @@
 #include <unistd.h>
 #include <utility>
 
-#include "text.h"
+#include "terminal/text.h"
 
 namespace CTL::DOCTOR {
 

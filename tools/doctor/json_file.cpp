@@ -8,7 +8,7 @@
 
 #include "base/file_io.h"
 #include "base/json_io.h"
-#include "text.h"
+#include "terminal/text.h"
 
 namespace CTL::DOCTOR {
 

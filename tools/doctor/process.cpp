@@ -2,7 +2,7 @@
 
 #include <fstream>
 
-#include "text.h"
+#include "terminal/text.h"
 
 namespace CTL::DOCTOR {
 

@@ -4,9 +4,8 @@
 #include <iostream>
 #include <unistd.h>
 
-#include "colour.h"
-#include "terminal.h"
-#include "text.h"
+#include "terminal/terminal.h"
+#include "terminal/text.h"
 
 namespace CTL::DOCTOR {
 

@@ -2,9 +2,8 @@
 
 #include <algorithm>
 
-#include "status/service_screen.h"
-#include "text.h"
-#include "watch/share_text.h"
+#include "terminal/text.h"
+#include "watch/service_text.h"
 
 namespace CTL {
 

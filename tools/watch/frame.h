@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-#include "fit.h"
-#include "terminal.h"
+#include "terminal/fit.h"
+#include "terminal/terminal.h"
 #include "watch/watch_output.h"
 
 namespace CTL {

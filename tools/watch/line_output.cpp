@@ -2,10 +2,10 @@
 
 #include <iostream>
 
-#include "output.h"
-#include "text.h"
-#include "time_text.h"
-#include "watch/share_text.h"
+#include "terminal/output.h"
+#include "terminal/text.h"
+#include "terminal/times.h"
+#include "watch/service_text.h"
 
 namespace CTL {
 

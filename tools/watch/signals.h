@@ -5,7 +5,7 @@
 #include <vector>
 
 #include "base/unique_fd.h"
-#include "status/queue_counter.h"
+#include "state/queue_counter.h"
 
 namespace CTL {
 

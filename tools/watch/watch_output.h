@@ -3,14 +3,14 @@
 
 #include <vector>
 
-#include "status/progress.h"
-#include "status/service.h"
+#include "state/queue_pace.h"
+#include "state/service_state.h"
 
 namespace CTL {
 
 struct WatchedState {
     ServiceState service;
-    std::vector<Progress> progress; // of the shares, in their order
+    std::vector<QueuePace> progress; // of the shares, in their order
 };
 
 // Where `watch` shows what it sees.

@@ -1,0 +1,94 @@
+#include <algorithm>
+#include <memory>
+
+#include "commands/command.h"
+#include "doctor/report.h"
+#include "terminal/output.h"
+
+namespace CTL {
+
+namespace {
+
+using namespace DOCTOR;
+
+constexpr char kFooter[] =
+    R"(Looks at what usually goes wrong and says how to mend it. Changes nothing.
+
+The checks are settings, locks, shares, folders, daemon, queues, monitor,
+spotlight and room; without CHECK all are made. What only root can look at is
+reported as unknown.
+
+A queue is long beyond 16 MiB or 100000 events, and old when its first event
+has waited for an hour, or for a day once the daemon has taken it over. A lock
+counts as held when one process holds it for a second. A share is nearly full
+with less than a twentieth of it free (at most 10 GiB, at least 100 MiB).
+
+Exit status: 0 no error, though maybe warnings; 1 an error; 2 mistake in the
+call.
+
+Examples:
+  fileindexctl doctor
+  fileindexctl doctor --quiet
+  fileindexctl doctor locks daemon --json=pretty)";
+
+const std::vector<Check> kChecks = {
+    {"settings", "Settings", CheckSettings},
+    {"locks", "Locks", CheckLocks},
+    {"shares", "Shares", CheckShares},
+    {"folders", "Folders", CheckFolders},
+    {"daemon", "Daemon", CheckDaemon},
+    {"queues", "Queues", CheckQueues},
+    {"monitor", "Change monitor", CheckMonitor},
+    {"spotlight", "Spotlight", CheckSpotlight},
+    {"room", "Room", CheckRoom},
+};
+
+struct Options {
+    std::vector<std::string> checks;
+    bool isQuiet = false;
+    JsonMode json = JsonMode::kOff;
+};
+
+bool IsWanted(const Check &check, const Options &options) {
+    return options.checks.empty() || std::find(options.checks.begin(), options.checks.end(),
+                                               check.name) != options.checks.end();
+}
+
+ExitCode Run(const Options &options) {
+    const Evidence evidence = GatherEvidence();
+    Report report;
+    for (const Check &check : kChecks) {
+        if (IsWanted(check, options)) {
+            report.push_back({&check, check.look(evidence)});
+        }
+    }
+    if (options.json == JsonMode::kOff) {
+        PrintReport(report, options.isQuiet);
+    } else {
+        PrintJson(ReportAsJson(report, options.isQuiet), options.json);
+    }
+    return CountOf(report, Severity::kError) == 0 ? kDone : kFailed;
+}
+
+std::vector<std::string> CheckNames() {
+    std::vector<std::string> names;
+    names.reserve(kChecks.size());
+    for (const Check &check : kChecks) {
+        names.emplace_back(check.name);
+    }
+    return names;
+}
+
+} // namespace
+
+Action DeclareDoctor(CLI::App &app) {
+    const auto options = std::make_shared<Options>();
+    app.add_option("CHECK", options->checks, "Only these checks")
+        ->check(CLI::IsMember(CheckNames()).description(""));
+    app.add_flag("--quiet,-q", options->isQuiet, "Show problems only");
+    AddJsonOption(app, options->json);
+    app.footer(kFooter);
+    return [options] { return Run(*options); };
+}
+
+} // namespace CTL

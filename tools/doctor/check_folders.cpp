@@ -1,0 +1,75 @@
+// The folders that are set: may they be indexed, and is there anything to index?
+
+#include <cerrno>
+#include <fileindex/share_path.h>
+#include <unistd.h>
+
+#include "doctor/checks.h"
+#include "doctor/file_kind.h"
+#include "state/index_refusal.h"
+#include "terminal/text.h"
+
+namespace CTL::DOCTOR {
+
+namespace {
+
+using VANO::FILEINDEX::Folder;
+
+// A rule that has refused a path which this user cannot reach may be a matter of rights only.
+bool IsForRootOnly(const Refusal &refusal, const std::string &fullPath) {
+    return std::string(refusal.rule) == "unreachable" && !fullPath.empty() &&
+           DirectoryError(fullPath) == EACCES && ::geteuid() != 0;
+}
+
+void LookAtFolder(Findings &findings, const Folder &folder) {
+    std::string fullPath;
+    (void)VANO::FILEINDEX::GetFullPath(fullPath, folder.path);
+    const std::optional<Refusal> refusal = RefusalOf(folder.path);
+    if (refusal && IsForRootOnly(*refusal, fullPath)) {
+        findings.push_back(Unreadable("", fullPath, EACCES));
+        return;
+    }
+    if (refusal) {
+        findings.push_back(
+            Error("folder-refused", folder.path, Shown(folder.path) + " cannot be indexed")
+                .Because(std::string("Rule ") + refusal->rule + ": " + refusal->why + ".")
+                .Mend(refusal->mend, ShowCommand(folder.path))
+                .With("rule", refusal->rule)
+                .With("full_path", fullPath));
+        return;
+    }
+    if (DirectoryError(fullPath) == ENOTDIR) {
+        findings.push_back(
+            Warning("folder-file", folder.path, Shown(folder.path) + " is no directory")
+                .Mend("Set the directory that holds it.", ShowCommand(folder.path)));
+    }
+    if (!folder.document && !folder.audio && !folder.video && !folder.photo) {
+        findings.push_back(
+            Warning("folder-typeless", folder.path,
+                    "Of " + Shown(folder.path) + " no file type is indexed")
+                .Mend("Choose some (set), or remove the folder.", ShowCommand(folder.path)));
+    }
+}
+
+} // namespace
+
+Findings CheckFolders(const Evidence &evidence) {
+    Findings findings;
+    if (!evidence.areFoldersKnown) {
+        findings.push_back(
+            Unknown("folders-unknown", kFolderConf, "The settings cannot be loaded; see Settings"));
+        return findings;
+    }
+    for (const Folder &folder : evidence.folders) {
+        LookAtFolder(findings, folder);
+    }
+    if (findings.empty()) {
+        findings.push_back(Ok("folders-good", "",
+                              evidence.HasFolders()
+                                  ? Count(evidence.folders.size(), "folder") + " may be indexed"
+                                  : "No folder is set"));
+    }
+    return findings;
+}
+
+} // namespace CTL::DOCTOR

@@ -1,0 +1,84 @@
+#include "state/folder_view.h"
+
+#include <algorithm>
+#include <iterator>
+
+namespace CTL {
+
+using VANO::FILEINDEX::Folder;
+
+namespace {
+
+Json::Value AdditionalKeys() {
+    Json::Value keys(Json::arrayValue);
+    keys.append("status");
+    keys.append("is_valid");
+    return keys;
+}
+
+} // namespace
+
+Json::Value WithFacts(const Json::Value &folder) {
+    Folder record;
+    // A share that is gone shows in the facts.
+    (void)record.Reload(folder["path"].asString(), folder);
+    return record.asJson(AdditionalKeys());
+}
+
+std::string TypesOf(const Json::Value &folder) {
+    std::string types;
+    for (const char *type : kFileTypes) {
+        if (folder[type].asBool()) {
+            types += (types.empty() ? "" : ",") + std::string(type);
+        }
+    }
+    return types;
+}
+
+std::string StatusOf(const Json::Value &folder) {
+    const Json::Value &facts = folder["additional"];
+    const std::string status = facts["status"].asString();
+    if (!facts["is_valid"].asBool()) {
+        return "cannot be indexed";
+    }
+    return status == "err_no_space" ? "out of space" : status;
+}
+
+Json::Value AsJson(const std::optional<Refusal> &refusal) {
+    Json::Value value;
+    if (refusal) {
+        value["rule"] = refusal->rule;
+        value["why"] = refusal->why;
+        value["mend"] = refusal->mend;
+    }
+    return value;
+}
+
+std::vector<std::string> PathsOf(const std::vector<Folder> &folders) {
+    std::vector<std::string> paths;
+    std::transform(folders.begin(), folders.end(), std::back_inserter(paths),
+                   [](const Folder &folder) { return folder.path; });
+    return paths;
+}
+
+std::vector<Folder> Resolved(const std::vector<Folder> &folders) {
+    std::vector<Folder> resolved;
+    std::copy_if(folders.begin(), folders.end(), std::back_inserter(resolved),
+                 [](const Folder &folder) { return !folder.full_path.empty(); });
+    return resolved;
+}
+
+bool IsSet(const std::string &path, const std::vector<Folder> &folders) {
+    return std::any_of(folders.begin(), folders.end(),
+                       [&](const Folder &folder) { return folder.path == path; });
+}
+
+std::vector<std::string> NotSet(const std::vector<std::string> &paths,
+                                const std::vector<Folder> &folders) {
+    std::vector<std::string> missing;
+    std::copy_if(paths.begin(), paths.end(), std::back_inserter(missing),
+                 [&](const std::string &path) { return !IsSet(path, folders); });
+    return missing;
+}
+
+} // namespace CTL

@@ -1,0 +1,44 @@
+#ifndef FILEINDEXCTL_STATE_FOLDER_VIEW_H
+#define FILEINDEXCTL_STATE_FOLDER_VIEW_H
+
+#include <array>
+#include <fileindex/folder.h>
+#include <json/value.h>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "state/index_refusal.h"
+
+namespace CTL {
+
+inline constexpr std::array<const char *, 4> kFileTypes = {"document", "audio", "video", "photo"};
+
+// A folder of a list with the facts that the library tells beside the setting itself.
+[[nodiscard]] Json::Value WithFacts(const Json::Value &folder);
+
+// "photo,video" of a folder's JSON object.
+[[nodiscard]] std::string TypesOf(const Json::Value &folder);
+
+// The folder's status in words, from its "additional" facts.
+[[nodiscard]] std::string StatusOf(const Json::Value &folder);
+
+// {"rule", "why", "mend"}; null when there is none.
+[[nodiscard]] Json::Value AsJson(const std::optional<Refusal> &refusal);
+
+[[nodiscard]] std::vector<std::string> PathsOf(const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+// Those whose share is there.
+[[nodiscard]] std::vector<VANO::FILEINDEX::Folder>
+Resolved(const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+[[nodiscard]] bool IsSet(const std::string &path,
+                         const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+// Those of the paths that are no folder settings.
+[[nodiscard]] std::vector<std::string> NotSet(const std::vector<std::string> &paths,
+                                              const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+} // namespace CTL
+
+#endif

@@ -1,0 +1,97 @@
+#include "state/known_shares.h"
+
+#include <fileindex/index_mgr.h>
+#include <fileindex/share_path.h>
+#include <fileindex/status_mgr.h>
+#include <map>
+
+#include "base/json_io.h"
+#include "state/share_record.h"
+#include "state/status_file.h"
+
+namespace CTL {
+
+namespace {
+
+using VANO::FILEINDEX::Folder;
+using VANO::FILEINDEX::IndexMgr;
+using VANO::FILEINDEX::StatusMgr;
+
+MarkedShare WithMarks(KnownShare share) {
+    MarkedShare facts{std::move(share)};
+    facts.isOutOfSpace = StatusMgr::ShareIsNoSpace(facts.name);
+    facts.needsReindex = StatusMgr::ShareIsNeedReindex(facts.name);
+    return facts;
+}
+
+} // namespace
+
+std::set<std::string> NamesIn(const Json::Value &object) {
+    const auto names = object.isObject() ? object.getMemberNames() : Json::Value::Members();
+    return {names.begin(), names.end()};
+}
+
+std::vector<KnownShare> SharesOf(const std::set<std::string> &names,
+                                 const std::vector<Folder> &folders) {
+    std::map<std::string, KnownShare> shares;
+    for (const std::string &name : names) {
+        shares[name].name = name;
+    }
+    for (const Folder &folder : folders) {
+        std::string name;
+        if (VANO::FILEINDEX::GetShareNameByPath(name, folder.path)) {
+            shares[name].name = name;
+            shares[name].folders.push_back(folder);
+        }
+    }
+    std::vector<KnownShare> list;
+    for (auto &[name, share] : shares) {
+        share.directory = DirectoryOfShare(name);
+        list.push_back(std::move(share));
+    }
+    return list;
+}
+
+bool ListShares(std::vector<MarkedShare> &shares) {
+    std::vector<Folder> folders;
+    Json::Value status;
+    if (!IndexMgr::List(folders) || !LoadStatus(status)) {
+        return false;
+    }
+    // A table that is not there or is broken names no share; the platform then knows none either.
+    Json::Value table;
+    (void)VANO::FILEINDEX::JsonFromFile(table, kShareTable);
+    std::set<std::string> names = NamesIn(table);
+    names.merge(NamesIn(status["no_space"]));
+    names.merge(NamesIn(status["need_reindex"]));
+    for (KnownShare &share : SharesOf(names, folders)) {
+        shares.push_back(WithMarks(std::move(share)));
+    }
+    return true;
+}
+
+std::string NameOfShare(const std::string &typed) {
+    if (IndexMgr::IsShareIndexed(typed) || StatusMgr::ShareIsNoSpace(typed) ||
+        StatusMgr::ShareIsNeedReindex(typed)) {
+        return typed;
+    }
+    const std::string own = OwnNameOf(typed);
+    return own.empty() ? typed : own;
+}
+
+bool LookUpShare(MarkedShare &share, const std::string &typed) {
+    std::vector<Folder> folders;
+    Json::Value status;
+    if (!IndexMgr::List(folders) || !LoadStatus(status)) {
+        return false;
+    }
+    const std::string name = NameOfShare(typed);
+    for (KnownShare &known : SharesOf({name}, folders)) {
+        if (known.name == name) {
+            share = WithMarks(std::move(known));
+        }
+    }
+    return true;
+}
+
+} // namespace CTL

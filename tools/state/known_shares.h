@@ -1,0 +1,47 @@
+#ifndef FILEINDEXCTL_STATE_KNOWN_SHARES_H
+#define FILEINDEXCTL_STATE_KNOWN_SHARES_H
+
+#include <fileindex/folder.h>
+#include <json/value.h>
+#include <set>
+#include <string>
+#include <vector>
+
+namespace CTL {
+
+// Where plain Linux has its shares. The platform finds shares by name and lists none.
+constexpr char kShareTable[] = "/usr/vano/etc/shares.json";
+
+struct KnownShare {
+    std::string name;
+    std::string directory; // empty when no share has that name
+    std::vector<VANO::FILEINDEX::Folder> folders;
+};
+
+// The members of an object, such as the share table, whose names are shares'; none of another
+// value.
+[[nodiscard]] std::set<std::string> NamesIn(const Json::Value &object);
+
+// The shares of these names and those that the folders lie in, in byte order.
+[[nodiscard]] std::vector<KnownShare> SharesOf(const std::set<std::string> &names,
+                                               const std::vector<VANO::FILEINDEX::Folder> &folders);
+
+struct MarkedShare : KnownShare {
+    bool isOutOfSpace = false;
+    bool needsReindex = false;
+};
+
+// Every share that has folder settings or marks, and those of the share table where the system has
+// one. False when the settings cannot be read.
+[[nodiscard]] bool ListShares(std::vector<MarkedShare> &shares);
+
+// The name under which a share is kept that a user names: as typed where the settings or the marks
+// have it so, or where there is no such share; else its own name.
+[[nodiscard]] std::string NameOfShare(const std::string &typed);
+
+// Of a single share by NameOfShare(), whether there is one of that name or not.
+[[nodiscard]] bool LookUpShare(MarkedShare &share, const std::string &typed);
+
+} // namespace CTL
+
+#endif

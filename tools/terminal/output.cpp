@@ -1,0 +1,92 @@
+#include "terminal/output.h"
+
+#include <CLI/CLI.hpp>
+#include <iostream>
+#include <json/writer.h>
+#include <unistd.h>
+
+#include "terminal/terminal.h"
+#include "terminal/text.h"
+
+namespace CTL {
+
+namespace {
+
+// What CLI11 reads into a JsonMode: the number of the one that `word` names.
+std::string JsonModeNumber(const std::string &word) {
+    const std::pair<const char *, JsonMode> modes[] = {
+        {"off", JsonMode::kOff}, {"short", JsonMode::kShort}, {"pretty", JsonMode::kPretty}};
+    for (const auto &[name, mode] : modes) {
+        if (word == name) {
+            return std::to_string(static_cast<int>(mode));
+        }
+    }
+    throw CLI::ValidationError("it is short, pretty or off, not '" + word + "'");
+}
+
+// JSON as people write it: a bracket stands behind its key, not below. No name holds a bare line
+// break, so that those found here are the writer's own.
+std::string BracketsRaised(const std::string &text) {
+    std::string raised;
+    std::size_t position = 0;
+    for (std::size_t end = 0; (end = text.find(": \n", position)) != std::string::npos;) {
+        raised.append(text, position, end + 2 - position);
+        position = text.find_first_not_of(' ', end + 3);
+    }
+    return raised + text.substr(position);
+}
+
+std::vector<GridColumn> ColumnsUnder(const std::vector<std::string> &headings) {
+    std::vector<GridColumn> columns(headings.size());
+    for (std::size_t i = 0; i < headings.size(); ++i) {
+        columns[i].heading = headings[i];
+    }
+    return columns;
+}
+
+} // namespace
+
+void AddJsonOption(CLI::App &app, JsonMode &mode) {
+    // A flag, so that the word after a plain --json is not taken for its value.
+    CLI::Option *json =
+        app.add_flag("--json{short}", mode, "Answer in JSON: on one line (short), indented or not");
+    json->transform(JsonModeNumber)->type_name("short|pretty|off");
+    app.add_flag_callback(
+           "-j",
+           [&mode] { mode = IsTerminal(STDOUT_FILENO) ? JsonMode::kPretty : JsonMode::kShort; },
+           "Answer in JSON: pretty on a terminal, short elsewhere")
+        ->excludes(json);
+}
+
+void PrintJson(const Json::Value &value, JsonMode mode) {
+    if (mode == JsonMode::kOff) {
+        return;
+    }
+    Json::StreamWriterBuilder builder;
+    builder["indentation"] = mode == JsonMode::kPretty ? "  " : "";
+    builder["enableYAMLCompatibility"] = mode == JsonMode::kPretty; // "key": value
+    builder["emitUTF8"] = true;
+    std::cout << ShownJson(BracketsRaised(Json::writeString(builder, value))) << '\n';
+}
+
+void PrintGrid(const Grid &grid) {
+    const std::vector<std::string> lines =
+        IsTerminal(STDOUT_FILENO) ? grid.Lines(LineWidth(STDOUT_FILENO), StyleOfOutput())
+                                  : grid.Rows();
+    for (const std::string &line : lines) {
+        std::cout << line << '\n';
+    }
+}
+
+Table::Table(const std::vector<std::string> &headings) : grid_(ColumnsUnder(headings)) {}
+
+void Table::Add(const std::vector<std::string> &cells) {
+    std::vector<std::string> row;
+    row.reserve(cells.size());
+    for (const std::string &cell : cells) {
+        row.push_back(cell.empty() ? "-" : Shown(cell));
+    }
+    grid_.Add(row);
+}
+
+} // namespace CTL
