@@ -17,29 +17,29 @@ namespace {
 const std::vector<CTL::Command> kCommands = {
     {"list", "Show the indexed folders", CTL::DeclareList},
     {"show", "Show one indexed folder", CTL::DeclareShow},
-    {"add", "Index folders, or index more of them", CTL::DeclareAdd},
-    {"set", "Change what is indexed of folders, or their name", CTL::DeclareSet},
+    {"add", "Index folders, or more of their file types", CTL::DeclareAdd},
+    {"set", "Change the file types or the name of folders", CTL::DeclareSet},
     {"remove", "Stop indexing folders", CTL::DeclareRemove},
-    {"reindex", "Index folders again from the start", CTL::DeclareReindex},
-    {"status", "Show how the service and the indexing are", CTL::DeclareStatus},
-    {"watch", "Follow the indexing until it is ended", CTL::DeclareWatch},
+    {"reindex", "Index folders again from scratch", CTL::DeclareReindex},
+    {"status", "Show daemon and indexing status", CTL::DeclareStatus},
+    {"watch", "Show the progress of indexing live", CTL::DeclareWatch},
     {"pause", "Pause all indexing", CTL::DeclarePause},
-    {"resume", "Go on with indexing", CTL::DeclareResume},
+    {"resume", "Resume indexing", CTL::DeclareResume},
     {"query", "Tell whether paths are indexed, and why", CTL::DeclareQuery},
-    {"share", "Follow what happens to a share", CTL::DeclareShare},
-    {"marks", "Tell or mark which steps of an upgrade are done", CTL::DeclareMarks},
-    {"migrate", "Follow an upgrade from the previous release", CTL::DeclareMigrate},
-    {"doctor", "Find what is wrong and how to mend it", CTL::DeclareDoctor},
+    {"share", "Adapt the index to changes of shares", CTL::DeclareShare},
+    {"marks", "List or set the marks of finished upgrade steps", CTL::DeclareMarks},
+    {"migrate", "Finish an upgrade from the previous release", CTL::DeclareMigrate},
+    {"doctor", "Find what is wrong and how to fix it", CTL::DeclareDoctor},
 };
 
 constexpr char kFooter[] =
-    R"(A path is a share path, /SHARE or /SHARE/FOLDER, or a full path of the file
-system. It is a share path when its first part names a share, else a full path
-when it lies in a share, else a share path whose share is gone.
+    R"(A path is a share path, /SHARE or /SHARE/FOLDER, or a full path in the file
+system. It is taken as a share path if its first component names a share, else
+as a full path if it lies in a share, else as a share path whose share is gone.
 
-Exit status: 0 done, 1 failed, 2 mistake in the call, 3 not indexed, not marked,
-or nothing of that name. Of status: 0 running, 3 paused or not running, 4 that
-could not be told, or no such folder.
+Exit status: 0 done; 1 failed; 2 usage error; 3 not indexed, not marked, or not
+found. For status: 0 running; 3 paused or not running; 4 unknown, or no such
+folder.
 
 Examples:
   fileindexctl add /photos --photo --video
@@ -90,8 +90,7 @@ int main(int argc, char **argv) {
     try {
         return Written(Run(argc, argv));
     } catch (const Json::Exception &failure) {
-        CTL::Say("A settings file holds a value of another kind than it should: " +
-                 CTL::Shown(failure.what()));
+        CTL::Say("A settings file holds a value of the wrong type: " + CTL::Shown(failure.what()));
         CTL::Advise("fileindexctl doctor settings shows where.");
     } catch (const std::exception &failure) {
         CTL::Say(CTL::Shown(failure.what()));

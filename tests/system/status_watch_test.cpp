@@ -86,8 +86,9 @@ TEST_F(StatusWatchTest, StatusShowsTheServiceAndItsFolders) {
     EXPECT_EQ(outcome.out, "Daemon:   running\n"
                            "Indexing: not paused\n"
                            "\n"
-                           "/media/films  finished    document,video  yes  0\n"
-                           "/photos       processing  photo           yes  3\n");
+                           "PATH          STATE       TYPES           VALID  PENDING\n"
+                           "/media/films  finished    document,video  yes          0\n"
+                           "/photos       processing  photo           yes          3\n");
 }
 
 TEST_F(StatusWatchTest, StatusOnATerminalHasHeadings) {
@@ -112,7 +113,8 @@ TEST_F(StatusWatchTest, StatusFitsATerminalAndIsWholeElsewhere) {
     PtyChild narrow({FILEINDEXCTL_PATH, "status"}, kPlainTerminal, 24, 40);
     EXPECT_EQ(narrow.Wait(), kPaused);
     EXPECT_THAT(narrow.Output(), HasSubstr("\r\n/photos/x...xxxxx/end  finished        0\r\n"));
-    EXPECT_THAT(Ctl({"status"}).out, HasSubstr("\n" + path + "  finished  photo  yes  0\n"));
+    EXPECT_THAT(Ctl({"status"}).out,
+                HasSubstr("\n" + path + "  finished  photo  yes          0\n"));
 }
 
 TEST_F(StatusWatchTest, StatusIsColouredOnATerminalThatCanShowIt) {
@@ -190,7 +192,8 @@ TEST_F(StatusWatchTest, StatusOfPathsShowsTheFoldersAroundThem) {
         EXPECT_EQ(Ctl({"status", path}).out, "Daemon:   stopped\n"
                                              "Indexing: not paused\n"
                                              "\n"
-                                             "/photos  finished  photo  yes  0\n")
+                                             "PATH     STATE     TYPES  VALID  PENDING\n"
+                                             "/photos  finished  photo  yes          0\n")
             << path;
     }
     EXPECT_THAT(Ctl({"status", "/media"}).out, HasSubstr("/media/films"));
@@ -201,7 +204,7 @@ TEST_F(StatusWatchTest, StatusOfPathsShowsTheFoldersAroundThem) {
 TEST_F(StatusWatchTest, StatusOfAPathThatIsNotIndexedIsFour) {
     const Outcome outcome = Ctl({"status", "/media/film"});
     EXPECT_EQ(outcome.status, kUnknown);
-    EXPECT_EQ(outcome.error, "fileindexctl: Nothing at /media/film is indexed.\n");
+    EXPECT_EQ(outcome.error, "fileindexctl: Nothing is indexed at /media/film.\n");
 }
 
 TEST_F(StatusWatchTest, StatusWithoutFoldersSaysSo) {
@@ -217,30 +220,33 @@ TEST_F(StatusWatchTest, StatusNotesWhatKeepsTheIndexingBack) {
     RemoveTree("/volume2/media/films");
     PutFile(kStatus, R"({"no_space":{"photos":true},"need_reindex":{"media":true}})");
     ASSERT_EQ(::mkfifo("/volume2/media/@eaDir", 0600), 0);
-    EXPECT_EQ(Ctl({"status"}).out, "Daemon:   stopped\n"
-                                   "Indexing: not paused\n"
-                                   "Note:     share media needs a new index\n"
-                                   "Note:     share media: its queue cannot be read: Not a "
-                                   "directory\n"
-                                   "Note:     share photos is out of space\n"
-                                   "\n"
-                                   "/media/films  cannot be indexed  document,video  no   ?\n"
-                                   "/photos       out of space       photo           yes  0\n");
+    EXPECT_EQ(Ctl({"status"}).out,
+              "Daemon:   stopped\n"
+              "Indexing: not paused\n"
+              "Note:     share media needs reindexing\n"
+              "Note:     share media: its queue cannot be read: Not a "
+              "directory\n"
+              "Note:     share photos is out of space\n"
+              "\n"
+              "PATH          STATE              TYPES           VALID  PENDING\n"
+              "/media/films  cannot be indexed  document,video  no           ?\n"
+              "/photos       out of space       photo           yes          0\n");
 }
 
 // A share that is gone is told from one without work.
 TEST_F(StatusWatchTest, StatusOfAShareThatIsGoneCountsNothing) {
     PutFile(kShares, R"({"photos":"/volume1/photos"})");
     EXPECT_THAT(Ctl({"status", "/media"}).out,
-                HasSubstr("/media/films  cannot be indexed  document,video  no  ?\n"));
+                HasSubstr("/media/films  cannot be indexed  document,video  no           ?\n"));
 }
 
 TEST_F(StatusWatchTest, StatusCountsBothQueueFilesForEachFolder) {
     PutFile(kFolders, R"({"/photos":{"photo":true},"/photos/2016":{"photo":true}})");
     PutFile(kTaken, Events(2, "/volume1/photos/2016/x"));
     PutFile(kQueue, Events(3) + Events(4, "/volume1/photos/20161") + "no event\n");
-    EXPECT_THAT(Ctl({"status"}).out, HasSubstr("/photos       processing  photo  yes  9\n"
-                                               "/photos/2016  processing  photo  yes  2\n"));
+    EXPECT_THAT(Ctl({"status"}).out,
+                HasSubstr("/photos       processing  photo  yes          9\n"
+                          "/photos/2016  processing  photo  yes          2\n"));
 }
 
 // What `list` gets from the library one folder at a time.
@@ -450,7 +456,7 @@ TEST_F(StatusWatchTest, WatchOfAPathThatIsNotIndexedFindsNothing) {
     const Outcome outcome = Ctl({"watch", "/media/film"});
     EXPECT_EQ(outcome.status, kNotFound);
     EXPECT_EQ(outcome.out, "");
-    EXPECT_EQ(outcome.error, "fileindexctl: Nothing at /media/film is indexed.\n");
+    EXPECT_EQ(outcome.error, "fileindexctl: Nothing is indexed at /media/film.\n");
 }
 
 TEST_F(StatusWatchTest, WatchOfSettingsThatCannotBeReadFails) {
@@ -504,7 +510,7 @@ TEST_F(StatusWatchTest, WatchDrawsInPlace) {
     StartDaemon();
     PutFile(kQueue, Events(3));
     const auto child = WatchOnTerminal();
-    ASSERT_TRUE(Eventually([&] { return Shows(*child, "q or Ctrl-C ends."); }));
+    ASSERT_TRUE(Eventually([&] { return Shows(*child, "Press q or Ctrl-C to end."); }));
     EXPECT_THAT(Picture(*child),
                 ElementsAre("Daemon:   running", "Indexing: not paused", "",
                             "SHARE   PENDING  PROGRESS",
@@ -513,7 +519,7 @@ TEST_F(StatusWatchTest, WatchDrawsInPlace) {
                             "PATH          STATE       TYPES           VALID  PENDING",
                             "/media/films  finished    document,video  yes          0",
                             "/photos       processing  photo           yes          3", "",
-                            "q or Ctrl-C ends."));
+                            "Press q or Ctrl-C to end."));
     EXPECT_THAT(child->Output(), StartsWith(kEnter));
 }
 
@@ -632,7 +638,7 @@ TEST_F(StatusWatchTest, WatchLeavesTheScreenForTheBackgroundAndTakesItAgainInThe
     // A shell that sends a job no signal when it brings it to the foreground while it runs.
     PtyChild shell({"/bin/bash", "--norc", "--noediting", "-i"}, kPlainTerminal, 24, 80);
     shell.Type(FILEINDEXCTL_PATH " watch --interval 3600 & sleep 0.5; fg\n");
-    ASSERT_TRUE(Says(shell, "Ctrl-C ends.")); // without waiting for the next look
+    ASSERT_TRUE(Says(shell, "Ctrl-C to end.")); // without waiting for the next look
     shell.Type(kCtrlZ);
     ASSERT_TRUE(Says(shell, "Stopped"));
     const std::size_t stopped = shell.Output().size();
@@ -641,7 +647,7 @@ TEST_F(StatusWatchTest, WatchLeavesTheScreenForTheBackgroundAndTakesItAgainInThe
     EXPECT_EQ(shell.Output().find(kEnter, stopped), std::string::npos);
     EXPECT_EQ(shell.Output().find("Daemon:", stopped), std::string::npos);
     shell.Type("fg\n");
-    ASSERT_TRUE(Says(shell, "Ctrl-C ends.", stopped));
+    ASSERT_TRUE(Says(shell, "Ctrl-C to end.", stopped));
     shell.Type("q");
     EXPECT_TRUE(Says(shell, kLeave, shell.Output().rfind(kEnter)));
 }

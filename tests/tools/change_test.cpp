@@ -128,7 +128,7 @@ TEST_F(CtlTest, AChangeInPrettyJsonIsIndented) {
                                                                  "  \"dry_run\": true\n"
                                                                  "}\n");
     EXPECT_EQ(Ctl({"resume", "--dry-run", "--json=off"}).out,
-              "Would end any pause and tell the daemon.\n");
+              "Would end the pause, if any, and tell the daemon.\n");
 }
 
 } // namespace

@@ -84,8 +84,8 @@ MATCHER_P2(Is, severity, code, "") {
 }
 
 // A problem that says what to do.
-MATCHER_P2(IsMendable, severity, code, "") {
-    return arg["severity"] == severity && arg["code"] == code && !arg["mend"].asString().empty();
+MATCHER_P2(IsFixable, severity, code, "") {
+    return arg["severity"] == severity && arg["code"] == code && !arg["fix"].asString().empty();
 }
 
 void MakeOlder(const std::string &path, long long seconds) {
@@ -240,12 +240,12 @@ TEST_F(DoctorTest, TheJsonFormIsStable) {
     EXPECT_EQ(
         outcome.out,
         R"({"errors":1,"findings":[{"check":"settings","code":"settings-none","command":"",)"
-        R"("mend":"","severity":"ok","subject":"/usr/vano/etc/fileindex/folder.conf",)"
+        R"("fix":"","severity":"ok","subject":"/usr/vano/etc/fileindex/folder.conf",)"
         R"("what":"No folder.conf yet: no folder is set","why":""},)"
         R"({"check":"settings","code":"settings-malformed","column":17,)"
-        R"("command":"editor /usr/vano/etc/fileindex/status.conf","line":1,)"
-        R"("mend":"Mend it by hand, or bring it back from a backup. Moved away, it counts as )"
-        R"(empty.","severity":"error","subject":"/usr/vano/etc/fileindex/status.conf",)"
+        R"("command":"editor /usr/vano/etc/fileindex/status.conf",)"
+        R"("fix":"Fix it by hand, or restore it from a backup. Moved away, it counts as empty.",)"
+        R"("line":1,"severity":"error","subject":"/usr/vano/etc/fileindex/status.conf",)"
         R"("what":"/usr/vano/etc/fileindex/status.conf is not JSON: line 1, column 17",)"
         R"("why":"Syntax error: value, object or array expected."}],)"
         R"("result":"error","unknown":0,"warnings":0})"
@@ -270,7 +270,7 @@ TEST_P(MalformedTest, IsFoundAtItsLineAndColumn) {
     for (const char *path : {kFolders, kStatus}) {
         PutFile(path, GetParam().text);
         const Json::Value problem = ProblemOf("settings");
-        EXPECT_THAT(problem, IsMendable("error", "settings-malformed"));
+        EXPECT_THAT(problem, IsFixable("error", "settings-malformed"));
         EXPECT_EQ(problem["subject"].asString(), path);
         EXPECT_EQ(problem["line"].asInt(), GetParam().line);
         EXPECT_EQ(problem["column"].asInt(), GetParam().column);
@@ -312,8 +312,8 @@ TEST_F(DoctorTest, WhatIsNoFileIsUnreadableAndHoldsNobodyUp) {
     ASSERT_EQ(::mkfifo(kFolders, 0644), 0);
     MakeDirs(kStatus);
     const std::vector<Json::Value> problems = Problems("settings");
-    EXPECT_THAT(problems, ElementsAre(IsMendable("error", "settings-unreadable"),
-                                      IsMendable("error", "settings-unreadable")));
+    EXPECT_THAT(problems, ElementsAre(IsFixable("error", "settings-unreadable"),
+                                      IsFixable("error", "settings-unreadable")));
     EXPECT_EQ(problems[0]["what"].asString(),
               "/usr/vano/etc/fileindex/folder.conf is no regular file");
 }
@@ -322,20 +322,20 @@ TEST_F(DoctorTest, AHugeFileIsUnreadable) {
     PutFile(kStatus, "{}");
     ASSERT_EQ(::truncate(kStatus, 1LL << 36), 0);
     const Json::Value problem = ProblemOf("settings");
-    EXPECT_THAT(problem, IsMendable("error", "settings-unreadable"));
+    EXPECT_THAT(problem, IsFixable("error", "settings-unreadable"));
     EXPECT_THAT(problem["what"].asString(), HasSubstr("File too large"));
 }
 
 TEST_F(DoctorTest, ADirectoryThatIsMissingKeepsSettingsFromBeingSaved) {
     RemoveTree(kSettings);
-    EXPECT_THAT(ProblemOf("settings"), IsMendable("error", "settings-directory-missing"));
+    EXPECT_THAT(ProblemOf("settings"), IsFixable("error", "settings-directory-missing"));
     PutFile(kSettings, "");
-    EXPECT_THAT(ProblemOf("settings"), IsMendable("error", "settings-directory-missing"));
+    EXPECT_THAT(ProblemOf("settings"), IsFixable("error", "settings-directory-missing"));
 }
 
 TEST_F(DoctorTest, JsonOfAnotherShapeIsAnError) {
     Save("[]");
-    EXPECT_THAT(ProblemOf("settings"), IsMendable("error", "settings-shape"));
+    EXPECT_THAT(ProblemOf("settings"), IsFixable("error", "settings-shape"));
 }
 
 TEST_F(DoctorTest, MembersThatCannotBeReadAreNamed) {
@@ -344,7 +344,7 @@ TEST_F(DoctorTest, MembersThatCannotBeReadAreNamed) {
     std::vector<std::string> subjects;
     for (const Json::Value &problem : Problems("settings")) {
         EXPECT_EQ(problem["code"].asString(), "settings-member");
-        EXPECT_NE(problem["mend"].asString(), "");
+        EXPECT_NE(problem["fix"].asString(), "");
         subjects.push_back(problem["subject"].asString());
     }
     EXPECT_THAT(subjects, ElementsAre("/a", "/b", "/c", "resume_time", "no_space"));
@@ -356,16 +356,16 @@ TEST_F(DoctorTest, MoreThanTheMostFoldersAreTooMany) {
         text += (i == 0 ? "\"/photos/" : ",\"/photos/") + std::to_string(i) + "\":{}";
     }
     Save(text + "}");
-    EXPECT_THAT(ProblemOf("settings"), IsMendable("warning", "settings-limit"));
+    EXPECT_THAT(ProblemOf("settings"), IsFixable("warning", "settings-limit"));
 }
 
 TEST_F(DoctorTest, OddOwnersModesAndLinksAreFound) {
     Save("{}");
     ASSERT_EQ(::chmod(kFolders, 0666), 0);
-    EXPECT_THAT(ProblemOf("settings"), IsMendable("warning", "odd-mode"));
+    EXPECT_THAT(ProblemOf("settings"), IsFixable("warning", "odd-mode"));
     ASSERT_EQ(::chmod(kFolders, 0600), 0);
     const Json::Value hidden = ProblemOf("settings");
-    EXPECT_THAT(hidden, IsMendable("warning", "odd-mode"));
+    EXPECT_THAT(hidden, IsFixable("warning", "odd-mode"));
     EXPECT_THAT(hidden["what"].asString(), HasSubstr("cannot be read by others: mode 0600"));
     ASSERT_EQ(::chmod(kFolders, 0644), 0);
     EXPECT_THAT(Problems("settings"), IsEmpty());
@@ -373,12 +373,12 @@ TEST_F(DoctorTest, OddOwnersModesAndLinksAreFound) {
     EXPECT_EQ(ProblemOf("settings")["command"].asString(), "chmod 755 /usr/vano/etc/fileindex");
     ASSERT_EQ(::chmod(kSettings, 0755), 0);
     if (::lchown(kFolders, 1000, 0) == 0) {
-        EXPECT_THAT(ProblemOf("settings"), IsMendable("warning", "odd-owner"));
+        EXPECT_THAT(ProblemOf("settings"), IsFixable("warning", "odd-owner"));
     }
     RemoveTree(kFolders);
     PutFile("/volume1/photos/folder.conf", "{}");
     ASSERT_EQ(::symlink("/volume1/photos/folder.conf", kFolders), 0);
-    EXPECT_THAT(ProblemOf("settings"), IsMendable("warning", "settings-link"));
+    EXPECT_THAT(ProblemOf("settings"), IsFixable("warning", "settings-link"));
 }
 
 TEST_F(DoctorTest, TemporaryFilesThatStayedBehindAreFoundAndThoseOfAWriterLeftAlone) {
@@ -389,7 +389,7 @@ TEST_F(DoctorTest, TemporaryFilesThatStayedBehindAreFoundAndThoseOfAWriterLeftAl
     EXPECT_THAT(Problems("settings"), IsEmpty());
     MakeOlder(stray, 3 * 3600);
     const Json::Value problem = ProblemOf("settings");
-    EXPECT_THAT(problem, IsMendable("warning", "stray-file"));
+    EXPECT_THAT(problem, IsFixable("warning", "stray-file"));
     EXPECT_EQ(problem["command"].asString(), "rm " + stray);
     EXPECT_THAT(problem["what"].asString(), HasSubstr("3 h ago"));
 }
@@ -402,7 +402,7 @@ TEST_F(DoctorTest, ALockThatIsHeldIsTracedToItsProcess) {
          {std::string(kFolderLock), std::string(kStatusLock), std::string(kPhotoQueue)}) {
         const HoldLock lock(path);
         const Json::Value problem = ProblemOf("locks");
-        EXPECT_THAT(problem, IsMendable("warning", "lock-held"));
+        EXPECT_THAT(problem, IsFixable("warning", "lock-held"));
         EXPECT_EQ(problem["subject"].asString(), path);
         EXPECT_EQ(problem["pid"].asInt(), ::getpid());
         EXPECT_THAT(problem["what"].asString(),
@@ -437,7 +437,7 @@ TEST_F(DoctorTest, WhatIsNoLockFileIsAnError) {
     EXPECT_EQ(ProblemOf("locks")["command"].asString(), "rmdir /tmp/fileidx_cfg_folder.lock");
     RemoveTree(kFolderLock);
     ASSERT_EQ(::mkfifo(kFolderLock, 0644), 0);
-    EXPECT_THAT(ProblemOf("locks"), IsMendable("error", "lock-kind"));
+    EXPECT_THAT(ProblemOf("locks"), IsFixable("error", "lock-kind"));
     RemoveTree(kFolderLock);
     ASSERT_EQ(::symlink("/nowhere", kFolderLock), 0);
     EXPECT_THAT(ProblemOf("locks")["what"].asString(), HasSubstr("is a symbolic link"));
@@ -458,18 +458,18 @@ TEST_F(DoctorTest, ALockFileOfSomebodyElseIsFound) {
 TEST_F(DoctorTest, AShareTableThatIsNoJsonIsFoundAtItsPlace) {
     PutFile(kShares, "{\n  \"photos\": /volume1/photos\n}");
     const Json::Value problem = ProblemOf("shares");
-    EXPECT_THAT(problem, IsMendable("error", "share-table-malformed"));
+    EXPECT_THAT(problem, IsFixable("error", "share-table-malformed"));
     EXPECT_EQ(problem["line"].asInt(), 2);
     EXPECT_EQ(problem["column"].asInt(), 13);
     PutFile(kShares, "[]");
-    EXPECT_THAT(ProblemOf("shares"), IsMendable("error", "share-table-shape"));
+    EXPECT_THAT(ProblemOf("shares"), IsFixable("error", "share-table-shape"));
 }
 
 TEST_F(DoctorTest, AMissingShareTableIsAnErrorOnceFoldersAreSet) {
     RemoveTree(kShares);
-    EXPECT_THAT(ProblemOf("shares"), IsMendable("warning", "share-table-missing"));
+    EXPECT_THAT(ProblemOf("shares"), IsFixable("warning", "share-table-missing"));
     Save(kTwo);
-    EXPECT_THAT(ProblemOf("shares"), IsMendable("error", "share-table-missing"));
+    EXPECT_THAT(ProblemOf("shares"), IsFixable("error", "share-table-missing"));
 }
 
 TEST_F(DoctorTest, EntriesThatThePlatformLeavesOutAreExplained) {
@@ -484,24 +484,24 @@ TEST_F(DoctorTest, EntriesThatThePlatformLeavesOutAreExplained) {
     for (const auto &[table, why] : rows) {
         PutFile(kShares, table);
         const Json::Value problem = ProblemOf("shares");
-        EXPECT_THAT(problem, IsMendable("error", "share-left-out")) << table;
+        EXPECT_THAT(problem, IsFixable("error", "share-left-out")) << table;
         EXPECT_THAT(problem["why"].asString(), HasSubstr(why)) << table;
     }
 }
 
 TEST_F(DoctorTest, AShareWhoseDirectoryIsGoneIsWorseWithFolders) {
     RemoveTree("/volume2/media");
-    EXPECT_THAT(ProblemOf("shares"), IsMendable("warning", "share-gone"));
+    EXPECT_THAT(ProblemOf("shares"), IsFixable("warning", "share-gone"));
     Save(kTwo);
     const Json::Value problem = ProblemOf("shares");
-    EXPECT_THAT(problem, IsMendable("error", "share-gone"));
+    EXPECT_THAT(problem, IsFixable("error", "share-gone"));
     EXPECT_EQ(problem["directory"].asString(), "/volume2/media");
 }
 
 TEST_F(DoctorTest, FoldersOfAShareThatIsUnknownAreFound) {
     Save(R"({"/gone/x":{"photo":true},"/gone/y":{"photo":true}})");
     const Json::Value problem = ProblemOf("shares");
-    EXPECT_THAT(problem, IsMendable("error", "share-unknown"));
+    EXPECT_THAT(problem, IsFixable("error", "share-unknown"));
     EXPECT_EQ(problem["command"].asString(), "fileindexctl share remove gone");
     EXPECT_EQ(Ctl({"share", "remove", "gone"}).status, kDone);
     EXPECT_THAT(Problems("shares"), IsEmpty());
@@ -512,7 +512,7 @@ TEST_F(DoctorTest, FoldersOfAShareThatIsUnknownAreFound) {
 std::string RuleFor(const std::string &folder) {
     PutFile(kFolders, "{\"" + folder + "\":{\"photo\":true}}");
     const Json::Value problem = ProblemOf("folders");
-    EXPECT_THAT(problem, IsMendable("error", "folder-refused"));
+    EXPECT_THAT(problem, IsFixable("error", "folder-refused"));
     EXPECT_THAT(problem["why"].asString(), StartsWith("Rule " + problem["rule"].asString() + ": "));
     return problem["rule"].asString();
 }
@@ -574,8 +574,8 @@ TEST_F(DoctorTest, EachRuleOfTheFileSystemIsNamed) {
 TEST_F(DoctorTest, FoldersThatIndexNothingAreFound) {
     PutFile("/volume1/photos/a.jpg", "");
     Save(R"({"/photos":{},"/photos/a.jpg":{"photo":true}})");
-    EXPECT_THAT(Problems("folders"), ElementsAre(IsMendable("warning", "folder-typeless"),
-                                                 IsMendable("warning", "folder-file")));
+    EXPECT_THAT(Problems("folders"), ElementsAre(IsFixable("warning", "folder-typeless"),
+                                                 IsFixable("warning", "folder-file")));
 }
 
 TEST_F(DoctorTest, ANameCannotPlayTricksOnTheTerminalNorOnTheShell) {
@@ -614,10 +614,10 @@ TEST_F(DoctorTest, ADaemonThatDoesNotRunIsAnErrorOnceFoldersAreSet) {
     EXPECT_THAT(Problems("daemon"), IsEmpty());
     Save(kTwo);
     const Json::Value problem = ProblemOf("daemon");
-    EXPECT_THAT(problem, IsMendable("error", "daemon-stopped"));
+    EXPECT_THAT(problem, IsFixable("error", "daemon-stopped"));
     EXPECT_THAT(problem["command"].asString(), HasSubstr("fileindexd"));
     Save("{");
-    EXPECT_THAT(ProblemOf("daemon"), IsMendable("warning", "daemon-stopped"));
+    EXPECT_THAT(ProblemOf("daemon"), IsFixable("warning", "daemon-stopped"));
 }
 
 TEST_F(DoctorTest, ASocketThatWasLeftBehindIsNoDaemon) {
@@ -626,14 +626,14 @@ TEST_F(DoctorTest, ASocketThatWasLeftBehindIsNoDaemon) {
     EXPECT_THAT(ProblemOf("daemon")["what"].asString(), HasSubstr("left behind"));
     RemoveTree(kSocket);
     PutFile(kSocket, "");
-    EXPECT_THAT(ProblemOf("daemon"), IsMendable("error", "daemon-socket"));
+    EXPECT_THAT(ProblemOf("daemon"), IsFixable("error", "daemon-socket"));
 }
 
 TEST_F(DoctorTest, ADaemonThatTakesNoConnectionIsSilent) {
     Save(kTwo);
     const Listener deaf(1);
     const Json::Value problem = ProblemOf("daemon");
-    EXPECT_THAT(problem, IsMendable("error", "daemon-silent"));
+    EXPECT_THAT(problem, IsFixable("error", "daemon-silent"));
     EXPECT_EQ(problem["pid"].asInt(), ::getpid());
     EXPECT_THAT(problem["why"].asString(), StartsWith("doctor_test (PID "));
     // Connections that nobody took wait on; there is no room for more.
@@ -664,7 +664,7 @@ TEST_F(DoctorTest, LinesThatAreNoEventsAreCounted) {
                              "{\n[]\n{\"event\":1}\n{\"path\":\"/x\"}\n" +
                              EventLine("/volume1/photos/a") + "half a li");
     const Json::Value problem = ProblemOf("queues");
-    EXPECT_THAT(problem, IsMendable("warning", "queue-malformed"));
+    EXPECT_THAT(problem, IsFixable("warning", "queue-malformed"));
     EXPECT_EQ(problem["malformed"].asInt(), 5);
     EXPECT_EQ(problem["events"].asInt(), 2);
     EXPECT_EQ(problem["whole"].asBool(), true);
@@ -679,7 +679,7 @@ TEST_F(DoctorTest, AQueueThatGrewIsFoundByItsBytesAndByItsEvents) {
     }
     PutFile(kPhotoQueue, many);
     const Json::Value byEvents = ProblemOf("queues");
-    EXPECT_THAT(byEvents, IsMendable("warning", "queue-long"));
+    EXPECT_THAT(byEvents, IsFixable("warning", "queue-long"));
     EXPECT_EQ(byEvents["events"].asInt(), 100001);
     PutFile(kPhotoQueue, EventLine("/volume1/photos/" + std::string(1 << 19, 'x')));
     EXPECT_THAT(Problems("queues"), IsEmpty());
@@ -689,7 +689,7 @@ TEST_F(DoctorTest, AQueueThatGrewIsFoundByItsBytesAndByItsEvents) {
     }
     PutFile(kPhotoQueue, large);
     const Json::Value byBytes = ProblemOf("queues");
-    EXPECT_THAT(byBytes, IsMendable("warning", "queue-long"));
+    EXPECT_THAT(byBytes, IsFixable("warning", "queue-long"));
     EXPECT_EQ(byBytes["bytes"].asUInt64(), large.size());
     EXPECT_EQ(byBytes["whole"].asBool(), false);
     EXPECT_THAT(byBytes["what"].asString(), HasSubstr("more than"));
@@ -701,7 +701,7 @@ TEST_F(DoctorTest, AQueueThatNobodyTakesOverIsOld) {
     EXPECT_THAT(Problems("queues"), IsEmpty());
     MakeOlder(kPhotoQueue, 3 * 3600);
     const Json::Value problem = ProblemOf("queues");
-    EXPECT_THAT(problem, IsMendable("warning", "queue-old"));
+    EXPECT_THAT(problem, IsFixable("warning", "queue-old"));
     EXPECT_THAT(problem["what"].asString(), HasSubstr("has waited for 3 h"));
 }
 
@@ -715,7 +715,7 @@ TEST_F(DoctorTest, AQueueThatGrowsAllTheTimeIsAsOldAsItsFile) {
     MakeOlder(kPhotoQueue, -3 * 3600); // the last event came just now, by the clock below
     const Json::Value problems = OnOddSystem("ODD_SECONDS=10800", "queues");
     ASSERT_EQ(problems.size(), 1U);
-    EXPECT_THAT(problems[0], IsMendable("warning", "queue-old"));
+    EXPECT_THAT(problems[0], IsFixable("warning", "queue-old"));
 }
 
 TEST_F(DoctorTest, TheQueueThatTheDaemonTookOverMayTakeADay) {
@@ -741,7 +741,7 @@ TEST_F(DoctorTest, WhileIndexingIsPausedAnOldQueueIsNoProblem) {
 TEST_F(DoctorTest, WhatIsNoQueueIsNamed) {
     MakeDirs("/volume1/photos/@eaDir");
     ASSERT_EQ(::mkfifo(kPhotoQueue, 0644), 0);
-    EXPECT_THAT(ProblemOf("queues"), IsMendable("error", "queue-kind"));
+    EXPECT_THAT(ProblemOf("queues"), IsFixable("error", "queue-kind"));
     RemoveTree(kPhotoQueue);
     ASSERT_EQ(::symlink("/etc/passwd", kPhotoQueue), 0);
     EXPECT_THAT(ProblemOf("queues")["what"].asString(), HasSubstr("is a symbolic link"));
@@ -753,7 +753,7 @@ TEST_F(DoctorTest, ALinkInThePlaceOfTheQueuesDirectoryIsNotFollowed) {
     PutFile(secret, "no event\n");
     ASSERT_EQ(::symlink("/tmp/secret", "/volume1/photos/@eaDir"), 0);
     const Json::Value problem = ProblemOf("queues");
-    EXPECT_THAT(problem, IsMendable("error", "queue-kind"));
+    EXPECT_THAT(problem, IsFixable("error", "queue-kind"));
     EXPECT_EQ(problem["what"].asString(), "/volume1/photos/@eaDir is a symbolic link");
     const HoldLock lock(secret);
     EXPECT_THAT(Problems("locks"), IsEmpty());
@@ -775,7 +775,7 @@ TEST_F(DoctorTest, AShareThatIsNotWatchedIsFound) {
     MakeHealthy();
     RemoveTree(MonitorFileOf("media"));
     const Json::Value problem = ProblemOf("monitor");
-    EXPECT_THAT(problem, IsMendable("error", "monitor-missing"));
+    EXPECT_THAT(problem, IsFixable("error", "monitor-missing"));
     EXPECT_EQ(problem["subject"].asString(), "media");
     EXPECT_EQ(problem["command"].asString(), "fileindexctl share resume media");
     RemoveTree(kMonitors);
@@ -786,7 +786,7 @@ TEST_F(DoctorTest, AMonitorThatWatchesOtherFoldersIsFound) {
     MakeHealthy();
     Save(R"({"/photos/2016":{"photo":true},"/media/films":{"video":true}})");
     const Json::Value problem = ProblemOf("monitor");
-    EXPECT_THAT(problem, IsMendable("error", "monitor-differs"));
+    EXPECT_THAT(problem, IsFixable("error", "monitor-differs"));
     EXPECT_EQ(problem["why"].asString(),
               "Not watched: /volume1/photos/2016. Watched for nothing: /volume1/photos.");
 }
@@ -796,7 +796,7 @@ TEST_F(DoctorTest, AMonitorThatWatchesForNobodyIsFound) {
     Save(R"({"/photos":{"photo":true}})");
     const std::string file = MonitorFileOf("media");
     const Json::Value problem = ProblemOf("monitor");
-    EXPECT_THAT(problem, IsMendable("warning", "monitor-surplus"));
+    EXPECT_THAT(problem, IsFixable("warning", "monitor-surplus"));
     EXPECT_EQ(problem["command"].asString(), "rm " + file);
     EXPECT_EQ(problem["queue"].asString(), kMediaQueue);
 }
@@ -806,12 +806,12 @@ TEST_F(DoctorTest, AMonitorConfigurationThatIsBrokenIsFoundAtItsPlace) {
     const std::string file = MonitorFileOf("media");
     PutFile(file, "{\"config\":[}");
     const std::vector<Json::Value> problems = Problems("monitor");
-    ASSERT_THAT(problems, ElementsAre(IsMendable("error", "monitor-malformed"),
-                                      IsMendable("error", "monitor-missing")));
+    ASSERT_THAT(problems, ElementsAre(IsFixable("error", "monitor-malformed"),
+                                      IsFixable("error", "monitor-missing")));
     EXPECT_EQ(problems[0]["column"].asInt(), 12);
     PutFile(file, "[]");
-    EXPECT_THAT(Problems("monitor"), ElementsAre(IsMendable("error", "monitor-shape"),
-                                                 IsMendable("error", "monitor-missing")));
+    EXPECT_THAT(Problems("monitor"), ElementsAre(IsFixable("error", "monitor-shape"),
+                                                 IsFixable("error", "monitor-missing")));
 }
 
 TEST_F(DoctorTest, ConfigurationsOfOtherConsumersAreTheirOwn) {
@@ -829,11 +829,11 @@ TEST_F(DoctorTest, SpotlightThatIsOffIsFoundOnceFoldersAreSet) {
     PutFile(kSamba, "[global]\nspotlight = no\n");
     EXPECT_THAT(Problems("spotlight"), IsEmpty());
     Save(kTwo);
-    EXPECT_THAT(ProblemOf("spotlight"), IsMendable("warning", "spotlight-off"));
+    EXPECT_THAT(ProblemOf("spotlight"), IsFixable("warning", "spotlight-off"));
     PutFile(kSamba, "[global]\nspotlight = yes\n");
     EXPECT_THAT(Problems("spotlight"), IsEmpty());
     RemoveTree(kSamba);
-    EXPECT_THAT(ProblemOf("spotlight"), IsMendable("warning", "spotlight-unknown"));
+    EXPECT_THAT(ProblemOf("spotlight"), IsFixable("warning", "spotlight-unknown"));
 }
 
 // --- room ---------------------------------------------------------------------------------------
@@ -844,13 +844,13 @@ TEST_F(DoctorTest, FullAndNearlyFullSharesAreFound) {
         const Mount full("tiny", "/volume1/photos", "tmpfs", 0, "size=5m");
         ASSERT_TRUE(full);
         const Json::Value problem = ProblemOf("room");
-        EXPECT_THAT(problem, IsMendable("error", "share-full"));
+        EXPECT_THAT(problem, IsFixable("error", "share-full"));
         EXPECT_EQ(problem["size"].asInt(), 5 << 20);
     }
     const Mount small("tiny", "/volume1/photos", "tmpfs", 0, "size=50m");
     ASSERT_TRUE(small);
     const Json::Value problem = ProblemOf("room");
-    EXPECT_THAT(problem, IsMendable("warning", "share-nearly-full"));
+    EXPECT_THAT(problem, IsFixable("warning", "share-nearly-full"));
     EXPECT_THAT(problem["what"].asString(), HasSubstr("50 MiB of 50 MiB left"));
 }
 
@@ -912,7 +912,7 @@ TEST_F(DoctorTest, WhatCannotBeReachedIsNamed) {
     for (const auto &[setting, check, code] : rows) {
         const Json::Value problems = OnOddSystem(setting, check);
         ASSERT_EQ(problems.size(), 1U) << code;
-        EXPECT_THAT(problems[0], IsMendable("error", code));
+        EXPECT_THAT(problems[0], IsFixable("error", code));
         EXPECT_THAT(problems[0]["what"].asString(), HasSubstr(" cannot be read: ")) << code;
     }
 }
@@ -920,11 +920,11 @@ TEST_F(DoctorTest, WhatCannotBeReachedIsNamed) {
 TEST_F(DoctorTest, WhatCannotBeReadIsNamed) {
     RemoveTree(kShares);
     MakeDirs(kShares);
-    EXPECT_THAT(ProblemOf("shares"), IsMendable("error", "share-table-unreadable"));
+    EXPECT_THAT(ProblemOf("shares"), IsFixable("error", "share-table-unreadable"));
     PutFile(kMonitors, "");
-    EXPECT_THAT(ProblemOf("monitor"), IsMendable("error", "monitor-unreadable"));
+    EXPECT_THAT(ProblemOf("monitor"), IsFixable("error", "monitor-unreadable"));
     ASSERT_EQ(::symlink("fileindexd.sock", kSocket), 0); // leads to itself
-    EXPECT_THAT(ProblemOf("daemon"), IsMendable("error", "daemon-unreachable"));
+    EXPECT_THAT(ProblemOf("daemon"), IsFixable("error", "daemon-unreachable"));
 }
 
 TEST_F(DoctorTest, WhatDependsOnBrokenSettingsIsUnknown) {
@@ -950,7 +950,7 @@ TEST_F(DoctorTest, OnATerminalLinesFitAndMarksAreColoured) {
               "           Missing '}' or object member name\r\n"
               "             {\r\n"
               "              ^\r\n"
-              "           Mend it by hand, or bring it back from a backup.\r\n"
+              "           Fix it by hand, or restore it from a backup.\r\n"
               "           Moved away, it counts as empty.\r\n"
               "             editor /usr/vano/etc/fileindex/status.conf\r\n"
               "\r\n"

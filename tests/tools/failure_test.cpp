@@ -30,7 +30,7 @@ TEST_F(CtlTest, ALockThatSomebodyHoldsLeadsToTheDoctor) {
     const HoldLock other(kStatusLock);
     EXPECT_THAT(Ctl({"marks", "set", "a"}).error,
                 AllOf(HasSubstr("Cannot mark a as done: the settings are locked."),
-                      HasSubstr("try again. fileindexctl doctor locks tells which.")));
+                      HasSubstr("try again, or run fileindexctl doctor locks.")));
 }
 
 TEST_F(CtlTest, ALockThatCannotBeOpenedIsToldFromOneThatIsHeld) {
@@ -41,7 +41,7 @@ TEST_F(CtlTest, ALockThatCannotBeOpenedIsToldFromOneThatIsHeld) {
     EXPECT_EQ(outcome.status, kFailed);
     EXPECT_THAT(outcome.error,
                 AllOf(HasSubstr("Cannot add /photos: a lock file cannot be opened: Is a directory"),
-                      HasSubstr("\n  fileindexctl doctor locks looks at it.")));
+                      HasSubstr("\n  Run fileindexctl doctor locks.")));
 }
 
 TEST_F(CtlTest, ADaemonThatIsNotThereLeadsToTheDoctor) {
@@ -52,7 +52,7 @@ TEST_F(CtlTest, ADaemonThatIsNotThereLeadsToTheDoctor) {
     Save(kTwo);
     for (const Words &arguments :
          {Words{"add", "/photos", "--photo"}, Words{"remove", "/photos"}}) {
-        EXPECT_THAT(Ctl(arguments).error, HasSubstr("fileindexctl doctor tells what is wrong"));
+        EXPECT_THAT(Ctl(arguments).error, HasSubstr("fileindexctl doctor shows what is wrong"));
     }
 }
 

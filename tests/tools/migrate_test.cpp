@@ -28,8 +28,8 @@ TEST_F(CtlTest, MigrateQueuesEveryFolder) {
     EXPECT_EQ(outcome.out, R"({"command":"migrate","done":true,"dry_run":false,)"
                            R"("paths":["/media/films","/photos"]})"
                            "\n");
-    EXPECT_EQ(outcome.error, "fileindexctl: The services follow the settings, and every folder is "
-                             "queued for a new index.\n");
+    EXPECT_EQ(outcome.error, "fileindexctl: The services are up to date, and every folder is "
+                             "queued for reindexing.\n");
     EXPECT_THAT(ReadText(kPhotoQueue), HasSubstr(R"("event":65536,"path":"/volume1/photos")"));
     EXPECT_THAT(NamesIn(kMonitors), SizeIs(2));
 }
@@ -39,9 +39,9 @@ TEST_F(CtlTest, MigrateDryRunTellsAndDoesNothing) {
     const Outcome outcome = Ctl({"migrate", "--dry-run"});
     EXPECT_EQ(outcome.status, kDone);
     EXPECT_EQ(outcome.out, "Would start fileindexd and switch Spotlight on.\n"
-                           "Would have every share with indexed folders watched.\n"
-                           "Would queue /media/films for a new index.\n"
-                           "Would queue /photos for a new index.\n");
+                           "Would watch every share that has indexed folders.\n"
+                           "Would queue /media/films for reindexing.\n"
+                           "Would queue /photos for reindexing.\n");
     EXPECT_FALSE(Exists(kPhotoQueue));
     EXPECT_FALSE(Exists(kMonitors));
 }
@@ -51,7 +51,7 @@ TEST_F(CtlTest, MigrateThatStopsHalfWaySaysSo) {
     RemoveTree("/etc/init.d/fileindexd"); // there is no such service to start
     const Outcome outcome = Ctl({"migrate"});
     EXPECT_EQ(outcome.status, kFailed);
-    EXPECT_THAT(outcome.error, HasSubstr("The migration stopped half-way"));
+    EXPECT_THAT(outcome.error, HasSubstr("The migration stopped halfway"));
     EXPECT_FALSE(Exists(kPhotoQueue));
 }
 

@@ -57,20 +57,20 @@ INSTANTIATE_TEST_SUITE_P(
                  {"query", "--why", "/media"},
                  kNotFound,
                  "not indexed  /media\n"
-                 "  no indexed folder holds it\n"},
+                 "  not in any indexed folder\n"},
         Question{"WhyNotWithAFinalSlash",
                  {"query", "--why", "/photos/"},
                  kNotFound,
                  "not indexed  /photos/\n"
-                 "  not by /photos, for its final slash\n"
-                 "  nor could it be: its path has symbolic links or other detours; it leads to "
+                 "  not by /photos, because of the trailing slash\n"
+                 "  nor could it be: its path has symbolic links or the like; the real path is "
                  "/volume1/photos\n"},
         Question{"WhyReservedName",
                  {"query", "--why", "/photos/@eaDir/x"},
                  kDone,
                  "indexed  /photos/@eaDir/x\n"
                  "  by /photos, for photo\n"
-                 "  but left out: the system keeps a name in the path for itself\n"},
+                 "  but left out: a name in its path is reserved by the system\n"},
         Question{"WhyMissing",
                  {"query", "--why", "/photos/nix"},
                  kDone,
@@ -83,7 +83,7 @@ INSTANTIATE_TEST_SUITE_P(
                  "indexed  /volume1/photos/2016\n"
                  "  by /photos, for photo\n"
                  "not indexed  /etc\n"
-                 "  no indexed folder holds it\n"
+                 "  not in any indexed folder\n"
                  "  nor could it be: it lies in no share\n"},
         Question{"WhyShare",
                  {"query", "--why", "--share", "photos", "music"},
@@ -91,13 +91,13 @@ INSTANTIATE_TEST_SUITE_P(
                  "indexed  photos\n"
                  "  by /photos\n"
                  "not indexed  music\n"
-                 "  no indexed folder lies in it\n"},
+                 "  it has no indexed folder\n"},
         Question{"WhyAsJson",
                  {"query", "--why", "--json", "/photos/@eaDir", "/media"},
                  kNotFound,
                  R"({"query":[{"asked":"/photos/@eaDir","indexed":true,"refusal":)"
-                 R"({"mend":"Use another name.","rule":"reserved-name",)"
-                 R"("why":"the system keeps a name in the path for itself"},"setting":)"
+                 R"({"fix":"Use another name.","rule":"reserved-name",)"
+                 R"("why":"a name in its path is reserved by the system"},"setting":)"
                  R"({"audio":false,"document":false,"name":"Photos","path":"/photos",)"
                  R"("photo":true,"video":false}},{"asked":"/media","indexed":false,)"
                  R"("refusal":null,"setting":null}]})"
@@ -127,6 +127,29 @@ TEST_F(CtlTest, QueryOfBrokenSettingsIsNoAnswer) {
         EXPECT_EQ(outcome.out, "");
         EXPECT_THAT(outcome.error, HasSubstr("Cannot tell what is indexed"));
     }
+}
+
+TEST_F(CtlTest, QueryWhySaysThatAFileIsOfAnotherType) {
+    Save(kPhotos);
+    for (const char *name : {"a.JPG", "a.txt", "a", ".jpg", "a.raw b"}) {
+        PutFile(std::string("/volume1/photos/") + name, "");
+    }
+    MakeDirs("/volume1/photos/b.txt");
+    const std::pair<const char *, const char *> rows[] = {
+        {"/photos/a.JPG", ""},
+        {"/photos/b.txt", ""},
+        {"/photos/a.txt", "  but left out: by its name, the file is of type document\n"},
+        {"/photos/a", "  but left out: by its name, the file is of none of the four types\n"},
+        {"/photos/.jpg", "  but left out: by its name, the file is of none of the four types\n"},
+        {"/photos/a.raw b", "  but left out: by its name, the file is of none of the four types\n"},
+    };
+    for (const auto &[path, line] : rows) {
+        EXPECT_EQ(Ctl({"query", "--why", path}).out,
+                  std::string("indexed  ") + path + "\n  by /photos, for photo\n" + line);
+    }
+    EXPECT_EQ(
+        Json(Ctl({"query", "--why", "--json", "/photos/a.txt"}).out)["query"][0]["refusal"]["rule"],
+        "file-type");
 }
 
 TEST_F(CtlTest, QueryWhyNamesTheSettingOfAShareThatIsGone) {

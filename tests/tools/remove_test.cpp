@@ -25,7 +25,7 @@ TEST_F(CtlTest, RemoveOfSomethingThatIsNotSetRemovesNothing) {
     Save(kPhotos);
     const Outcome outcome = Ctl({"remove", "/photos", "/photo"});
     EXPECT_EQ(outcome.status, kNotFound);
-    EXPECT_THAT(outcome.error, HasSubstr("Nothing is removed: /photo is not set."));
+    EXPECT_THAT(outcome.error, HasSubstr("Nothing was removed: /photo is not an indexed folder."));
     EXPECT_EQ(ReadText(kFolders), kPhotos);
     EXPECT_THAT(Told(), IsEmpty());
 }
@@ -87,7 +87,7 @@ TEST_F(CtlTest, RemoveOfAFolderWhoseShareIsGoneIsDone) {
     EXPECT_EQ(outcome.status, kDone);
     EXPECT_EQ(outcome.error,
               "fileindexctl: Removed /gone/x.\n"
-              "  There was no index to delete of /gone/x: no share has that name.\n");
+              "  There was no index to delete for /gone/x: no share has that name.\n");
     EXPECT_THAT(ReadJson(kFolders).getMemberNames(), ElementsAre("/media", "/photos"));
 }
 

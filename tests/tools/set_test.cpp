@@ -37,7 +37,7 @@ TEST_F(CtlTest, SetOfAFolderThatIsNotSetChangesNothing) {
     Save(kPhotos);
     const Outcome outcome = Ctl({"set", "/photos", "/media", "--photo=no"});
     EXPECT_EQ(outcome.status, kNotFound);
-    EXPECT_THAT(outcome.error, HasSubstr("Nothing is changed: /media is not set."));
+    EXPECT_THAT(outcome.error, HasSubstr("Nothing was changed: /media is not an indexed folder."));
     EXPECT_EQ(ReadText(kFolders), kPhotos);
 }
 

@@ -37,7 +37,7 @@ TEST_P(ShareMarkTest, IsToldSetAndCleared) {
     EXPECT_EQ(Run({}).status, kDone);
     EXPECT_EQ(Run({}).out, "S" + yes);
 
-    EXPECT_EQ(Run({"--clear", "--dry-run"}).out, "Would see to it that s" + no);
+    EXPECT_EQ(Run({"--clear", "--dry-run"}).out, "Would ensure that s" + no);
     EXPECT_EQ(Run({}).status, kDone);
     EXPECT_EQ(Run({"--clear"}).error, "fileindexctl: S" + no);
     EXPECT_FALSE(ReadJson(kStatus)[GetParam().key].isMember("photos"));
@@ -77,13 +77,13 @@ TEST_P(ShareMarkTest, OfABrokenStatusFileIsAFailureNotACrash) {
     PutFile(kStatus, std::string("{\"") + GetParam().key + R"(":"word"})");
     const Outcome outcome = Run({"--set"});
     EXPECT_EQ(outcome.status, kFailed);
-    EXPECT_THAT(outcome.error, HasSubstr("A settings file holds a value of another kind"));
+    EXPECT_THAT(outcome.error, HasSubstr("A settings file holds a value of the wrong type"));
 }
 
 INSTANTIATE_TEST_SUITE_P(Marks, ShareMarkTest,
                          ::testing::Values(Kind{"no-space", "no_space", "out of space"},
                                            Kind{"need-reindex", "need_reindex",
-                                                "needing a new index"}),
+                                                "needing reindexing"}),
                          [](const auto &row) {
                              return row.param.key == std::string("no_space") ? "NoSpace"
                                                                              : "NeedReindex";

@@ -17,7 +17,7 @@ TEST_F(CtlTest, ShareRenameMovesTheFolders) {
     const Outcome outcome = Ctl({"share", "rename", "photos", "pictures"});
     EXPECT_EQ(outcome.status, kDone);
     EXPECT_EQ(outcome.error, "fileindexctl: Moved the folders of photos to pictures.\n"
-                             "  fileindexctl share resume makes the service follow.\n");
+                             "  Run fileindexctl share resume next.\n");
     const Json::Value folders = ReadJson(kFolders);
     EXPECT_THAT(folders.getMemberNames(), ElementsAre("/media/films", "/pictures"));
     EXPECT_EQ(folders["/pictures"]["name"].asString(), "Photos");
@@ -56,7 +56,7 @@ TEST_F(CtlTest, SharePauseWithoutADaemonFails) {
     Save(kPhotos);
     const Outcome outcome = Ctl({"share", "pause", "photos"});
     EXPECT_EQ(outcome.status, kFailed);
-    EXPECT_THAT(outcome.error, HasSubstr("Cannot stop the work on share photos"));
+    EXPECT_THAT(outcome.error, HasSubstr("Cannot stop indexing share photos"));
 }
 
 constexpr char kWithGone[] = R"({"/gone/x":{"photo":true},"/photos":{"photo":true},)"
@@ -69,8 +69,8 @@ TEST_F(CtlTest, ShareListShowsSharesFoldersAndMarks) {
     EXPECT_EQ(outcome.status, kDone);
     EXPECT_EQ(outcome.out, "gone    -                1  no such share\n"
                            "media   /volume2/media   0  -\n"
-                           "old     -                0  no such share, needs a new index\n"
-                           "photos  /volume1/photos  2  out of space, needs a new index\n");
+                           "old     -                0  no such share, needs reindexing\n"
+                           "photos  /volume1/photos  2  out of space, needs reindexing\n");
     EXPECT_EQ(outcome.error, "");
 }
 
@@ -97,7 +97,7 @@ TEST_F(CtlTest, ShareListWithoutATableShowsSharesWithFolders) {
     }
     RemoveTree(kShares);
     RemoveTree(kFolders);
-    EXPECT_EQ(Ctl({"share", "list"}).error, "fileindexctl: No share is known.\n");
+    EXPECT_EQ(Ctl({"share", "list"}).error, "fileindexctl: There are no shares.\n");
 }
 
 TEST_F(CtlTest, ShareListReadsTheTableAsThePlatformDoes) {
@@ -174,9 +174,9 @@ TEST_F(CtlTest, SharePauseAndResumeDryRunTellAndDoNothing) {
     StartDaemon();
     Save(kPhotos);
     EXPECT_EQ(Ctl({"share", "pause", "photos", "--dry-run"}).out,
-              "Would stop the work on share photos.\n");
+              "Would stop indexing share photos.\n");
     EXPECT_EQ(Ctl({"share", "resume", "photos", "--dry-run"}).out,
-              "Would take up the work on share photos.\n");
+              "Would resume indexing share photos.\n");
     EXPECT_FALSE(Exists(kMonitors));
     EXPECT_THAT(Told(), IsEmpty());
 }

@@ -35,7 +35,7 @@ TEST_F(CtlTest, ShowOfWhatIsNotSetFindsNothing) {
         const Outcome outcome = Ctl({"show", path});
         EXPECT_EQ(outcome.status, kNotFound);
         EXPECT_EQ(outcome.out, "");
-        EXPECT_THAT(outcome.error, HasSubstr(std::string(path) + " is not set."));
+        EXPECT_THAT(outcome.error, HasSubstr(std::string(path) + " is not an indexed folder."));
     }
 }
 
@@ -56,15 +56,15 @@ TEST_F(CtlTest, ShowOfWhatLiesInAFolderNamesThatFolder) {
     Save(kPhotos);
     const Outcome outcome = Ctl({"show", "/volume1/photos/2016"});
     EXPECT_EQ(outcome.status, kNotFound);
-    EXPECT_EQ(outcome.error, "fileindexctl: /photos/2016 is not set.\n"
-                             "  It lies in /photos, which is.\n");
+    EXPECT_EQ(outcome.error, "fileindexctl: /photos/2016 is not an indexed folder.\n"
+                             "  It lies in /photos, which is indexed.\n");
 }
 
 TEST_F(CtlTest, ShowNamesTheRuleThatRefusesTheFolder) {
     Save(kTwo);
     RemoveTree("/volume2/media/films");
     EXPECT_THAT(Ctl({"show", "/media/films"}).error,
-                HasSubstr("/media/films cannot be indexed: there is no such directory"));
+                HasSubstr("/media/films cannot be indexed: the directory does not exist"));
     EXPECT_EQ(Json(Ctl({"show", "/media/films", "--json"}).out)["refusal"]["rule"].asString(),
               "missing");
 }

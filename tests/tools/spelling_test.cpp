@@ -80,7 +80,7 @@ TEST_F(CtlTest, RemoveOfAMisspeltFolderKeepsTheIndexOfItsShare) {
     EXPECT_EQ(outcome.status, kFailed);
     EXPECT_THAT(outcome.error,
                 AllOf(HasSubstr("/Photos is set under another spelling of share photos"),
-                      HasSubstr("\n  fileindexctl share rename Photos photos sets it right")));
+                      HasSubstr("\n  fileindexctl share rename Photos photos corrects that")));
     EXPECT_EQ(ReadText(kFolders), misspelt);
     EXPECT_TRUE(Exists(kPhotoIndex));
     EXPECT_EQ(Ctl({"share", "rename", "Photos", "photos"}).status, kDone);

@@ -50,16 +50,16 @@ TEST_F(CtlTest, WhatShowTellsIsNeverCut) {
 
 TEST_F(CtlTest, OnATerminalJIsPretty) {
     Save(kPhotos);
-    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "list -j"), HasSubstr("  \"total\": 1\r\n"));
-    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "list --json"), HasSubstr("\"total\":1}\r\n"));
+    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "list -j"), HasSubstr("      \"video\": false\r\n"));
+    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "list --json"), HasSubstr("\"video\":false}]}\r\n"));
 }
 
 TEST_F(CtlTest, OnATerminalChangesSayAtOnceWhatIsWaitedFor) {
     StartDaemon();
     Save(kPhotos);
     EXPECT_EQ(CtlOnTerminal("TERM=xterm", "resume"),
-              "Telling the daemon ...\r\033[Kfileindexctl: Indexing goes on.\r\n");
-    EXPECT_EQ(CtlOnTerminal("TERM=dumb", "resume"), "fileindexctl: Indexing goes on.\r\n");
+              "Telling the daemon ...\r\033[Kfileindexctl: Indexing is resumed.\r\n");
+    EXPECT_EQ(CtlOnTerminal("TERM=dumb", "resume"), "fileindexctl: Indexing is resumed.\r\n");
 }
 
 TEST_F(CtlTest, OffATerminalNoEscapeCodeIsWritten) {
@@ -93,12 +93,13 @@ TEST_F(CtlTest, OnATerminalMessagesBreakBetweenWords) {
     EXPECT_EQ(CtlOnTerminal("TERM=xterm", "query --why /photos/link"),
               "indexed  /photos/link\r\n"
               "  by /photos, for photo\r\n"
-              "  but left out: its path has symbolic links or other detours; it leads to\r\n"
+              "  but left out: its path has symbolic links or the like; the real path is\r\n"
               "    /volume1/photos/2016\r\n");
     RemoveTree("/volume1/photos");
-    EXPECT_THAT(CtlOnTerminal("TERM=xterm", "show /photos"),
-                HasSubstr("fileindexctl: /photos cannot be indexed: there is no such directory:\r\n"
-                          "  /volume1/photos.\r\n"));
+    EXPECT_THAT(
+        CtlOnTerminal("TERM=xterm", "show /photos"),
+        HasSubstr("fileindexctl: /photos cannot be indexed: the directory does not exist:\r\n"
+                  "  /volume1/photos.\r\n"));
 }
 
 } // namespace

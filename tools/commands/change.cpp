@@ -23,7 +23,7 @@ void Change::Would(const std::string &what) const {
 }
 
 Action MakeChange(CLI::App &app, Change &change, Action act) {
-    app.add_flag("--dry-run", change.isDryRun, "Only tell what would be done");
+    app.add_flag("--dry-run", change.isDryRun, "Only show what would be done");
     AddJsonOption(app, change.json);
     return [name = NameOf(app), &change, act = std::move(act)] {
         const ExitCode result = act();

@@ -10,7 +10,8 @@ namespace CTL {
 
 namespace {
 
-constexpr char kFooter[] = R"(A folder that is set already keeps its other file types and its name.
+constexpr char kFooter[] =
+    R"(A folder that is already indexed keeps its other file types and its name.
 
 Examples:
   fileindexctl add /photos --photo --video
@@ -49,7 +50,7 @@ void Check(const Options &options) {
         std::find(options.types.begin(), options.types.end(), true) != options.types.end();
     if (!hasType && !options.all) {
         throw CLI::ValidationError(
-            "Say what to index: --document, --audio, --video, --photo or --all");
+            "Choose what to index: --document, --audio, --video, --photo or --all");
     }
     if (!options.name.empty() && options.paths.size() > 1) {
         throw CLI::ValidationError("--name is for a single folder");
@@ -67,7 +68,7 @@ Action DeclareAdd(CLI::App &app) {
     for (std::size_t i = 0; i < kFileTypes.size(); ++i) {
         app.add_flag(std::string("--") + kFileTypes[i], options->types[i], meanings[i]);
     }
-    app.add_flag("--all", options->all, "Index all of these");
+    app.add_flag("--all", options->all, "Index all four file types");
     app.footer(kFooter);
     app.callback([options] { Check(*options); });
     return MakeChange(app, options->change, [options] { return Run(*options); });

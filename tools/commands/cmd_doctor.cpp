@@ -12,19 +12,18 @@ namespace {
 using namespace DOCTOR;
 
 constexpr char kFooter[] =
-    R"(Looks at what usually goes wrong and says how to mend it. Changes nothing.
+    R"(Checks what usually goes wrong and says how to fix it. Changes nothing.
 
 The checks are settings, locks, shares, folders, daemon, queues, monitor,
-spotlight and room; without CHECK all are made. What only root can look at is
+spotlight and room; without CHECK all are run. What only root can check is
 reported as unknown.
 
-A queue is long beyond 16 MiB or 100000 events, and old when its first event
-has waited for an hour, or for a day once the daemon has taken it over. A lock
-counts as held when one process holds it for a second. A share is nearly full
-with less than a twentieth of it free (at most 10 GiB, at least 100 MiB).
+A queue is long above 16 MiB or 100000 events, and old if its first event has
+waited for an hour, or for a day after the daemon took the queue over. A lock is
+reported if it is held for a second. A share is nearly full if less than 5 % of
+it is free (more than 10 GiB is always enough, less than 100 MiB never).
 
-Exit status: 0 no error, though maybe warnings; 1 an error; 2 mistake in the
-call.
+Exit status: 0 no error, perhaps warnings; 1 errors; 2 usage error.
 
 Examples:
   fileindexctl doctor
@@ -83,7 +82,7 @@ std::vector<std::string> CheckNames() {
 
 Action DeclareDoctor(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    app.add_option("CHECK", options->checks, "Only these checks")
+    app.add_option("CHECK", options->checks, "Run only these checks")
         ->check(CLI::IsMember(CheckNames()).description(""));
     app.add_flag("--quiet,-q", options->isQuiet, "Show problems only");
     AddJsonOption(app, options->json);

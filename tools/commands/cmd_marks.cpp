@@ -15,7 +15,7 @@ namespace {
 using VANO::FILEINDEX::StatusMgr;
 
 constexpr char kFooter[] =
-    R"(Marks are set once, by the steps of an upgrade that must not run twice.
+    R"(Upgrade steps that must run only once set a mark when they are done.
 
 Examples:
   fileindexctl marks list --json

@@ -16,8 +16,8 @@ namespace {
 using VANO::FILEINDEX::Folder;
 
 constexpr char kFooter[] =
-    R"(For the upgrade step, after an upgrade from the previous release. The settings
-stay as they are. Running it again does all of it again.
+    R"(Run after an upgrade from the previous release: brings the services in line with
+the settings and reindexes every folder. The settings stay as they are.
 
 Examples:
   fileindexctl migrate --dry-run
@@ -29,9 +29,9 @@ void Preview(const std::vector<Folder> &folders, const Change &change) {
         return;
     }
     change.Would("start fileindexd and switch Spotlight on");
-    change.Would("have every share with indexed folders watched");
+    change.Would("watch every share that has indexed folders");
     for (const Folder &folder : folders) {
-        change.Would("queue " + Shown(folder.path) + " for a new index");
+        change.Would("queue " + Shown(folder.path) + " for reindexing");
     }
 }
 
@@ -45,13 +45,12 @@ ExitCode Run(Change &change) {
         Preview(folders, change);
         return kDone;
     }
-    if (!While("Bringing the services into line",
-               [] { return VANO::FILEINDEX::Updater_zem60_beta2(); })) {
-        return Fail("The migration stopped half-way");
+    if (!While("Updating the services", [] { return VANO::FILEINDEX::Updater_zem60_beta2(); })) {
+        return Fail("The migration stopped halfway");
     }
     Say(folders.empty() ? "fileindexd is stopped: no folder is indexed."
-                        : "The services follow the settings, and every folder is queued for a "
-                          "new index.");
+                        : "The services are up to date, and every folder is queued for "
+                          "reindexing.");
     return kDone;
 }
 

@@ -15,8 +15,8 @@ namespace {
 using VANO::FILEINDEX::Status;
 
 constexpr char kFooter[] =
-    R"(Without an option the pause has no end. 07:30 is the next time that the clock
-shows it.
+    R"(Without a time, indexing stays paused until fileindexctl resume. 07:30 is the
+next time that the clock shows it.
 
 Examples:
   fileindexctl pause
@@ -31,7 +31,6 @@ constexpr long long kLatestEnd = std::numeric_limits<std::int32_t>::max();
 struct Options {
     std::string duration;
     std::string until;
-    bool isForever = false; // as without any option
     long long resumeTime = kPausedWithoutEnd;
     Change change;
 };
@@ -73,20 +72,22 @@ void ReadTimes(Options &options) {
     long long seconds = 0;
     std::time_t end = 0;
     if (!options.duration.empty() && !ReadDuration(seconds, options.duration)) {
-        throw CLI::ValidationError("--for is a number with d, h or m, such as 8h or 1d12h, not '" +
-                                   options.duration + "'");
+        throw CLI::ValidationError(
+            "--for takes a number with d, h or m, such as 8h or 1d12h, not '" + options.duration +
+            "'");
     }
     if (!options.until.empty() && !ReadMoment(end, options.until, now)) {
-        throw CLI::ValidationError("--until is a time such as 07:30 or '2026-12-24 18:00', "
+        throw CLI::ValidationError("--until takes a time such as 07:30 or '2026-12-24 18:00', "
                                    "not '" +
                                    options.until + "'");
     }
     options.resumeTime = options.until.empty() ? now + seconds : end;
     if (options.resumeTime <= now) {
-        throw CLI::ValidationError("That pause would be over at once");
+        throw CLI::ValidationError("That pause would end immediately");
     }
     if (options.resumeTime > kLatestEnd) {
-        throw CLI::ValidationError("The service cannot count so far: use --forever");
+        throw CLI::ValidationError("A pause cannot end after January 2038; leave out the time to "
+                                   "pause until further notice");
     }
 }
 
@@ -94,14 +95,11 @@ void ReadTimes(Options &options) {
 
 Action DeclarePause(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    CLI::Option *duration = app.add_option("--for", options->duration, "For so long: 8h, 90m, 2d");
+    CLI::Option *duration = app.add_option("--for", options->duration, "How long: 8h, 90m, 2d");
     duration->type_name("TIME");
     CLI::Option *until =
-        app.add_option("--until", options->until, "Until 07:30, or until a day and time");
+        app.add_option("--until", options->until, "Until a time, or a date and time");
     until->type_name("TIME")->excludes(duration);
-    app.add_flag("--forever", options->isForever, "Until fileindexctl resume")
-        ->excludes(duration)
-        ->excludes(until);
     app.footer(kFooter);
     app.callback([options, duration, until] {
         // An empty word is no time, but CLI11 hands it on as if none had been given.

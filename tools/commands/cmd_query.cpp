@@ -21,11 +21,10 @@ using VANO::FILEINDEX::Folder;
 using VANO::FILEINDEX::IndexMgr;
 
 constexpr char kFooter[] =
-    R"(A path is indexed when it is an indexed folder or lies in one. --why names the
-setting that governs it, with its file types, and what keeps the path from being
-indexed.
+    R"(A path is indexed if it is an indexed folder or lies in one. --why names the
+folder and its file types, and tells what keeps the path out of the index.
 
-Exit status: 0 when all of them are indexed, 3 otherwise.
+Exit status: 0 if all of them are indexed, 3 otherwise.
 
 Examples:
   fileindexctl query /photos/2016
@@ -138,11 +137,13 @@ std::string MistakeIn(const Options &options) {
 
 Action DeclareQuery(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    AddPathsTo(app, options->asked, "Share paths or full paths, or what the options say");
-    CLI::Option *share = app.add_flag("--share", options->isShare, "They are names of shares");
-    app.add_flag("--full-path", options->isFullPath, "They are full paths, whatever they look like")
+    AddPathsTo(app, options->asked, "Share paths or full paths");
+    CLI::Option *share =
+        app.add_flag("--share", options->isShare, "The arguments are names of shares");
+    app.add_flag("--full-path", options->isFullPath,
+                 "The arguments are full paths, whatever they look like")
         ->excludes(share);
-    app.add_flag("--why", options->isWhy, "Tell the reason too");
+    app.add_flag("--why", options->isWhy, "Show the reason too");
     AddJsonOption(app, options->json);
     app.footer(kFooter);
     app.callback([options] {

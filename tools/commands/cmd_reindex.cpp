@@ -15,9 +15,9 @@ using VANO::FILEINDEX::Folder;
 using VANO::FILEINDEX::IndexMgr;
 
 constexpr char kFooter[] =
-    R"(Shares that ran out of space are tried again. When one of the paths is not
-indexed, nothing is done, and the exit status is 3. --all leaves out folders
-whose share is gone, and the exit status is then 1.
+    R"(Shares that ran out of space are tried again. If one of the paths is not
+indexed, nothing is done and the exit status is 3. --all skips folders whose
+share is gone; the exit status is then 1.
 
 Examples:
   fileindexctl reindex /photos
@@ -34,14 +34,14 @@ ExitCode Queue(const std::vector<std::string> &paths, Change &change) {
     change.facts["paths"] = ArrayOf(paths);
     if (change.isDryRun) {
         for (const std::string &path : paths) {
-            change.Would("queue " + Shown(path) + " for a new index");
+            change.Would("queue " + Shown(path) + " for reindexing");
         }
         return kDone;
     }
     if (!While("Queueing", [&] { return IndexMgr::Reindex(ArrayOf(paths)); })) {
-        return Fail("Cannot index " + Named(paths) + " again");
+        return Fail("Cannot reindex " + Named(paths));
     }
-    Say("Queued " + Named(paths) + " for a new index.");
+    Say("Queued " + Named(paths) + " for reindexing.");
     return kDone;
 }
 
@@ -55,9 +55,9 @@ ExitCode QueuePaths(Options &options, const std::vector<Folder> &folders) {
         }
     }
     if (!unknown.empty()) {
-        Say("Nothing is done: " + Named(unknown) +
+        Say("Nothing was done: " + Named(unknown) +
             (unknown.size() == 1 ? " is not indexed." : " are not indexed."));
-        Advise("fileindexctl add indexes a folder.");
+        Advise("Use fileindexctl add to index a folder.");
         return kNotFound;
     }
     return Queue(paths, options.change);
@@ -77,8 +77,8 @@ ExitCode QueueAll(Options &options, const std::vector<Folder> &folders) {
         Say("No folder is indexed.");
     }
     if (!gone.empty()) {
-        Say("Left out " + Named(gone) + ": no share has that name.");
-        Advise("fileindexctl remove drops a setting.");
+        Say("Skipped " + Named(gone) + ": no share has that name.");
+        Advise("Use fileindexctl remove to remove the setting.");
         result = kFailed;
     }
     return result;
@@ -87,7 +87,7 @@ ExitCode QueueAll(Options &options, const std::vector<Folder> &folders) {
 ExitCode Run(Options &options) {
     std::vector<Folder> folders;
     if (!IndexMgr::List(folders)) {
-        return Fail("Cannot index anything again");
+        return Fail("Cannot reindex");
     }
     return options.all ? QueueAll(options, folders) : QueuePaths(options, folders);
 }
@@ -96,13 +96,13 @@ ExitCode Run(Options &options) {
 
 Action DeclareReindex(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    CLI::Option *paths = AddPathsTo(app, options->paths, "Paths in indexed folders, or above some");
+    CLI::Option *paths = AddPathsTo(app, options->paths, "Paths in or above indexed folders");
     paths->check(CheckSharePath)->required(false);
     app.add_flag("--all", options->all, "Every indexed folder")->excludes(paths);
     app.footer(kFooter);
     app.callback([options] {
         if (options->paths.empty() && !options->all) {
-            throw CLI::ValidationError("Say what to index again: PATH... or --all");
+            throw CLI::ValidationError("Choose what to index again: PATH... or --all");
         }
     });
     return MakeChange(app, options->change, [options] { return Run(*options); });

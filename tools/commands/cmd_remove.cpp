@@ -20,8 +20,8 @@ using VANO::FILEINDEX::Folder;
 using VANO::FILEINDEX::IndexMgr;
 
 constexpr char kFooter[] =
-    R"(The files stay; a share without indexed folders loses its index. When one of the
-folders is not set, nothing is removed, and the exit status is 3.
+    R"(The files stay. A share that has no indexed folder left loses its index. If one
+of the folders is not indexed, nothing is removed and the exit status is 3.
 
 Examples:
   fileindexctl remove /photos
@@ -99,11 +99,11 @@ ExitCode Remove(const std::vector<std::string> &paths) {
             NotSet(paths, folders).size() < paths.size()) {
             return Fail("Cannot remove " + Named(paths));
         }
-        return FailHalfWay("The setting is removed", "fileindexctl doctor tells what is wrong.");
+        return FailHalfWay("The setting is removed", "fileindexctl doctor shows what is wrong.");
     }
     Say("Removed " + Named(paths) + ".");
     if (!gone.empty()) {
-        Advise("There was no index to delete of " + Named(gone) + ": no share has that name.");
+        Advise("There was no index to delete for " + Named(gone) + ": no share has that name.");
     }
     return kDone;
 }
@@ -118,10 +118,10 @@ bool IsMisspelt(const std::string &asked, const std::vector<Folder> &folders) {
 ExitCode SayMisspelt(const std::string &asked) {
     const std::string share = ShareOf(asked);
     const std::string own = OwnNameOf(share);
-    Say("Nothing is removed: " + Shown(asked) + " is set under another spelling of share " +
+    Say("Nothing was removed: " + Shown(asked) + " is set under another spelling of share " +
         Shown(own) + ", which would lose its index.");
     Advise("fileindexctl share rename " + Shown(share) + " " + Shown(own) +
-           " sets it right; remove it then.");
+           " corrects that; then remove it.");
     return kFailed;
 }
 
@@ -141,8 +141,8 @@ ExitCode Run(Options &options) {
     // The library takes a folder that is not set for removed.
     const std::vector<std::string> missing = NotSet(paths, folders);
     if (!missing.empty()) {
-        Say("Nothing is removed: " + NamedNotSet(missing) + ".");
-        Advise("fileindexctl list shows the folders that are.");
+        Say("Nothing was removed: " + NamedNotSet(missing) + ".");
+        Advise("fileindexctl list shows the indexed folders.");
         return kNotFound;
     }
     const std::vector<std::string> left = Left(folders, paths);

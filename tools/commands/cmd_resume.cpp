@@ -17,14 +17,14 @@ constexpr char kFooter[] = R"(Examples:
 
 ExitCode Run(const Change &change) {
     if (change.isDryRun) {
-        change.Would("end any pause and tell the daemon");
+        change.Would("end the pause, if any, and tell the daemon");
         return kDone;
     }
     if (!While("Telling the daemon", [] { return fileindex::StatusMgr::Resume(); })) {
         return IsUnsaved() ? Fail("Cannot end the pause")
                            : FailHalfWay("The end of the pause is saved", kDaemonAdvice);
     }
-    Say("Indexing goes on.");
+    Say("Indexing is resumed.");
     return kDone;
 }
 

@@ -16,8 +16,8 @@ using VANO::FILEINDEX::Folder;
 using VANO::FILEINDEX::IndexMgr;
 
 constexpr char kFooter[] =
-    R"(What is not named stays as it is. When one of the folders is not set, nothing is
-changed, and the exit status is 3: fileindexctl add sets folders.
+    R"(Only what is given changes. If one of the folders is not indexed, nothing is
+changed and the exit status is 3; use fileindexctl add to index a folder.
 
 Examples:
   fileindexctl set /photos --video=no
@@ -57,20 +57,20 @@ ExitCode Run(Options &options) {
     // The library would add a folder that is not set.
     const std::vector<std::string> missing = NotSet(paths, folders);
     if (!missing.empty()) {
-        Say("Nothing is changed: " + NamedNotSet(missing) + ".");
-        Advise("fileindexctl list shows the folders that are, add sets more.");
+        Say("Nothing was changed: " + NamedNotSet(missing) + ".");
+        Advise("fileindexctl list shows the indexed folders; add indexes more.");
         return kNotFound;
     }
     return Apply(options.change, RequestFor(paths, MembersOf(options)), kWording);
 }
 
 std::string CheckYesNo(const std::string &word) {
-    return word == "yes" || word == "no" ? "" : "it is yes or no, not '" + word + "'";
+    return word == "yes" || word == "no" ? "" : "must be yes or no, not '" + word + "'";
 }
 
 void Check(const Options &options) {
     if (MembersOf(options).empty()) {
-        throw CLI::ValidationError("Say what to change: --document=yes|no, --audio=yes|no, "
+        throw CLI::ValidationError("Choose what to change: --document=yes|no, --audio=yes|no, "
                                    "--video=yes|no, --photo=yes|no or --name=NAME");
     }
     if (options.hasName && options.paths.size() > 1) {

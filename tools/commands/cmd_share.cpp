@@ -15,19 +15,20 @@ constexpr char kFooter[] = R"(Examples:
 
 std::string CheckName(const std::string &name) {
     return name.empty() || name.find('/') != std::string::npos
-               ? "'" + name + "' is no name of a share"
+               ? "'" + name + "' is not a share name"
                : "";
 }
 
 const std::vector<Command> kShareCommands = {
     {"list", "Show the shares, their folders and marks", DeclareShareList},
-    {"pause", "Stop the work on a share", DeclareSharePause},
-    {"resume", "Go on with the work on a share", DeclareShareResume},
-    {"remove", "Drop the folders of a share that is being removed", DeclareShareRemove},
+    {"pause", "Stop indexing a share", DeclareSharePause},
+    {"resume", "Resume indexing a share", DeclareShareResume},
+    {"remove", "Remove the folders of a share that is being removed", DeclareShareRemove},
     {"rename", "Move the folders of a share to its new name", DeclareShareRename},
     {"clean", "Delete the index of a share", DeclareShareClean},
-    {"no-space", "Tell or change whether a share ran out of space", DeclareShareNoSpace},
-    {"need-reindex", "Tell or change whether a share needs a new index", DeclareShareNeedReindex},
+    {"no-space", "Show or change the out-of-space mark of a share", DeclareShareNoSpace},
+    {"need-reindex", "Show or change the needs-reindexing mark of a share",
+     DeclareShareNeedReindex},
 };
 
 } // namespace

@@ -11,9 +11,8 @@ namespace CTL {
 namespace {
 
 constexpr char kFooter[] =
-    R"(Shown are the shares that the system names, and those that have folders or marks
-though they may be gone. The columns are share, directory, number of indexed
-folders, and state.
+    R"(Shows all shares of the system, and shares that are gone but still have folders
+or marks. The columns are share, directory, indexed folders and state.
 
 Examples:
   fileindexctl share list
@@ -31,7 +30,7 @@ std::string StateText(const MarkedShare &share) {
         text += (text.empty() ? "" : ", ") + std::string("out of space");
     }
     if (share.needsReindex) {
-        text += (text.empty() ? "" : ", ") + std::string("needs a new index");
+        text += (text.empty() ? "" : ", ") + std::string("needs reindexing");
     }
     return text;
 }
@@ -81,7 +80,7 @@ ExitCode Run(const Options &options) {
     }
     PrintShares(shares, options.json);
     if (shares.empty()) {
-        Say("No share is known.");
+        Say("There are no shares.");
     }
     return kDone;
 }
@@ -90,8 +89,8 @@ ExitCode Run(const Options &options) {
 
 Action DeclareShareList(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    CLI::Option *null =
-        app.add_flag("--null", options->isNull, "Only the names, a zero byte after each");
+    CLI::Option *null = app.add_flag("--null", options->isNull,
+                                     "Print only the names, each followed by a zero byte");
     AddJsonOption(app, options->json);
     null->excludes(app.get_option("--json"))->excludes(app.get_option("-j"));
     app.footer(kFooter);

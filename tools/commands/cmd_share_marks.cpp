@@ -17,16 +17,16 @@ namespace {
 using VANO::FILEINDEX::StatusMgr;
 
 constexpr char kNoSpaceFooter[] =
-    R"(Without an option tells whether the share is marked: exit status 0 when it is, 3
-when not. --set notifies the administrators, unless it was marked already.
+    R"(Without an option, tells whether the share is marked: exit status 0 if it is, 3
+if not. --set notifies the administrators unless the share was already marked.
 
 Examples:
   fileindexctl share no-space photos
   fileindexctl share no-space photos --revive)";
 
 constexpr char kNeedReindexFooter[] =
-    R"(Without an option tells whether the share is marked: exit status 0 when it is, 3
-when not.
+    R"(Without an option, tells whether the share is marked: exit status 0 if it is, 3
+if not.
 
 Examples:
   fileindexctl share need-reindex photos --json
@@ -43,9 +43,9 @@ struct Mark {
 
 constexpr Mark kNoSpace = {"no_space", "is marked as out of space", "is not marked as out of space",
                            StatusMgr::ShareIsNoSpace, StatusMgr::ShareSetNoSpace};
-constexpr Mark kNeedReindex = {"need_reindex", "is marked as needing a new index",
-                               "is not marked as needing a new index",
-                               StatusMgr::ShareIsNeedReindex, StatusMgr::ShareSetNeedReindex};
+constexpr Mark kNeedReindex = {"need_reindex", "is marked as needing reindexing",
+                               "is not marked as needing reindexing", StatusMgr::ShareIsNeedReindex,
+                               StatusMgr::ShareSetNeedReindex};
 
 struct Options {
     std::string share;
@@ -92,14 +92,14 @@ ExitCode ChangeMark(Options &options, const Mark &mark) {
     options.change.facts["shares"].append(share);
     const std::string sentence = "hare " + Shown(share) + " " + (options.set ? mark.yes : mark.no);
     if (options.change.isDryRun) {
-        options.change.Would("see to it that s" + sentence);
+        options.change.Would("ensure that s" + sentence);
         return kDone;
     }
     const bool isDone = While("Telling the indexing service", [&] {
         return options.revive ? StatusMgr::ShareRevive(share) : mark.change(share, options.set);
     });
     if (isDone) {
-        Say("S" + sentence + (options.revive ? ", and is worked on again." : "."));
+        Say("S" + sentence + (options.revive ? ", and is indexed again." : "."));
         return kDone;
     }
     return options.revive && !IsUnsaved() ? FailHalfWay("The mark is cleared", kDaemonAdvice)
@@ -127,7 +127,7 @@ std::shared_ptr<Options> AddMarkOptionsTo(CLI::App &app) {
 Action DeclareShareNoSpace(CLI::App &app) {
     const auto options = AddMarkOptionsTo(app);
     app.add_flag("--revive", options->revive,
-                 "Clear the mark and have the daemon work on the share again")
+                 "Clear the mark and have the daemon index the share again")
         ->excludes(app.get_option("--set"))
         ->excludes(app.get_option("--clear"));
     app.footer(kNoSpaceFooter);

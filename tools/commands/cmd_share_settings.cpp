@@ -22,15 +22,15 @@ using VANO::FILEINDEX::IndexMgr;
 
 constexpr char kRemoveFooter[] =
     R"(For a share that is being removed. The daemon is not told and the index stays:
-run fileindexctl share pause and clean first, while the share is there.
+run fileindexctl share pause and clean first, while the share still exists.
 
 Examples:
   fileindexctl share remove photos --dry-run
   fileindexctl share remove photos)";
 
 constexpr char kRenameFooter[] =
-    R"(For a share that has been renamed: the system must know it by its new name. Only
-the settings move; fileindexctl share pause goes before it and resume after it.
+    R"(For a share that has been renamed: the system must already know its new name.
+Only the settings move: run fileindexctl share pause before and resume after.
 
 Examples:
   fileindexctl share pause photos
@@ -49,7 +49,7 @@ struct RenameOptions {
 };
 
 ExitCode SayNoFolders(const std::string &share) {
-    Say("Nothing is done: no folder of share " + Shown(share) + " is indexed.");
+    Say("Nothing was done: no folder of share " + Shown(share) + " is indexed.");
     Advise("fileindexctl share list shows the shares.");
     return kNotFound;
 }
@@ -77,7 +77,7 @@ ExitCode RunRemove(RemoveOptions &options) {
     Say("Removed " + Count(share.folders.size(), "folder") + " of share " + Shown(share.name) +
         ".");
     if (!share.directory.empty()) {
-        Advise("Its index is still there: fileindexctl share clean deletes it.");
+        Advise("Its index still exists; fileindexctl share clean deletes it.");
     }
     return kDone;
 }
@@ -113,7 +113,7 @@ ExitCode RunRename(RenameOptions &options) {
         return Fail("Cannot move the folders of " + what);
     }
     Say("Moved the folders of " + what + ".");
-    Advise("fileindexctl share resume makes the service follow.");
+    Advise("Run fileindexctl share resume next.");
     return kDone;
 }
 
@@ -128,8 +128,8 @@ Action DeclareShareRemove(CLI::App &app) {
 
 Action DeclareShareRename(CLI::App &app) {
     const auto options = std::make_shared<RenameOptions>();
-    AddShareTo(app, "OLD", options->old, "Name that the share had");
-    AddShareTo(app, "NEW", options->now, "Name that it has now");
+    AddShareTo(app, "OLD", options->old, "Former name of the share");
+    AddShareTo(app, "NEW", options->now, "New name of the share");
     app.footer(kRenameFooter);
     return MakeChange(app, options->change, [options] { return RunRename(*options); });
 }

@@ -16,20 +16,21 @@ namespace {
 using VANO::FILEINDEX::IndexMgr;
 
 constexpr char kPauseFooter[] =
-    R"(The daemon drops the share's worker and the share is watched no more, until
-fileindexctl share resume. The settings stay.
+    R"(The daemon stops working on the share, and changes in it are no longer watched,
+until fileindexctl share resume. The settings stay.
 
 Examples:
   fileindexctl share pause photos)";
 
-constexpr char kResumeFooter[] = R"(The share is watched again, and the daemon starts its worker.
+constexpr char kResumeFooter[] =
+    R"(Changes in the share are watched again, and the daemon works on it.
 
 Examples:
   fileindexctl share resume photos)";
 
 constexpr char kCleanFooter[] =
-    R"(Deletes the share's index database and its event queue, for a share that is
-removed or to be indexed from nothing. The files and the settings stay.
+    R"(Deletes the share's index database and event queue, for a share that is removed
+or is to be indexed from scratch. The files and the settings stay.
 
 Examples:
   fileindexctl share clean photos --dry-run
@@ -38,20 +39,20 @@ Examples:
 // An operation on a share, and what is said about it.
 struct Operation {
     bool (*run)(const std::string &share);
-    const char *would; // "stop the work on share"
+    const char *would; // "stop indexing share"
     const char *attempt;
     const char *done;
     const char *next; // what to do then; may be empty
 };
 
-constexpr Operation kPause = {IndexMgr::SharePause, "stop the work on share",
-                              "Cannot stop the work on share", "Stopped the work on share",
-                              "fileindexctl share resume takes it up again."};
-constexpr Operation kResume = {IndexMgr::ShareResume, "take up the work on share",
-                               "Cannot take up the work on share", "Took up the work on share", ""};
+constexpr Operation kPause = {IndexMgr::SharePause, "stop indexing share",
+                              "Cannot stop indexing share", "Stopped indexing share",
+                              "Use fileindexctl share resume to resume."};
+constexpr Operation kResume = {IndexMgr::ShareResume, "resume indexing share",
+                               "Cannot resume indexing share", "Resumed indexing share", ""};
 constexpr Operation kClean = {IndexMgr::CleanShareIndexData, "delete the index of share",
                               "Cannot delete the index of share", "Deleted the index of share",
-                              "fileindexctl reindex makes a new one for its folders."};
+                              "Use fileindexctl reindex to rebuild it."};
 
 struct Options {
     std::string share;

@@ -17,7 +17,7 @@ namespace {
 
 namespace fileindex = VANO::FILEINDEX;
 
-constexpr char kFooter[] = R"(Exit status: 0, or 3 when the folder is not set.
+constexpr char kFooter[] = R"(Exit status: 0, or 3 if the folder is not indexed.
 
 Examples:
   fileindexctl show /photos
@@ -39,11 +39,11 @@ void PrintLines(const Json::Value &folder) {
 }
 
 ExitCode SayNotSet(const std::string &path, const std::vector<fileindex::Folder> &folders) {
-    Say(Shown(path) + " is not set.");
+    Say(Shown(path) + " is not an indexed folder.");
     const std::string governing =
         fileindex::GetMostSuitableCfg(Resolved(folders), ToFullPath(path))["path"].asString();
-    Advise(governing.empty() ? "fileindexctl list shows the folders that are."
-                             : "It lies in " + Shown(governing) + ", which is.");
+    Advise(governing.empty() ? "fileindexctl list shows the indexed folders."
+                             : "It lies in " + Shown(governing) + ", which is indexed.");
     return kNotFound;
 }
 
@@ -60,7 +60,7 @@ ExitCode Run(const Options &options) {
     if (setting == folders.end()) {
         return SayNotSet(path, folders);
     }
-    Json::Value answer = WithFacts(setting->asJson());
+    Json::Value answer = setting->asJson(FolderFacts());
     answer["full_path"] = ToFullPath(path);
     const auto refusal = RefusalOf(path);
     answer["refusal"] = AsJson(refusal);
@@ -71,7 +71,7 @@ ExitCode Run(const Options &options) {
     PrintLines(answer);
     if (refusal) {
         Say(Shown(path) + " cannot be indexed: " + refusal->why + ".");
-        Advise(refusal->mend);
+        Advise(refusal->fix);
     }
     return kDone;
 }

@@ -15,13 +15,13 @@ namespace CTL {
 namespace {
 
 constexpr char kFooter[] =
-    R"(Shows the folders that lie at or below a PATH or contain it; all without one.
-Pending are the events of the share's queue that the daemon has not done yet.
-The daemon counts as running when it listens for commands; whether it answers
-too is asked by fileindexctl doctor.
+    R"(Shows the folders at, below or above each PATH, or all folders without PATH.
+PENDING counts the queued events that the daemon has not handled yet. The daemon
+counts as running if it listens for commands; fileindexctl doctor also checks
+whether it answers.
 
-Exit status: 0 running, 3 paused or not running, 4 that could not be told, or
-no such folder; 2 mistake in the call.
+Exit status: 0 running; 3 paused or not running; 4 unknown, or no such folder;
+2 usage error.
 
 Examples:
   fileindexctl status
@@ -42,7 +42,10 @@ void PrintText(const ServiceState &state) {
     }
     if (!state.folders.empty()) {
         std::cout << '\n';
-        PrintGrid(FoldersOf(state, LineWidth(STDOUT_FILENO)));
+        const std::size_t width = LineWidth(STDOUT_FILENO);
+        for (const std::string &line : FoldersOf(state, width).Lines(width, StyleOfOutput())) {
+            std::cout << line << '\n';
+        }
     }
 }
 
@@ -62,7 +65,7 @@ ExitCode Run(const Options &options) {
     }
     if (!observer.Look(Clock::now() + kPatience)) {
         if (IsTerminal(STDOUT_FILENO)) {
-            Say("Counting what waits. The queues are long.");
+            Say("Counting pending events; the queues are long.");
         }
         (void)observer.Look(Clock::time_point::max());
     }
@@ -79,7 +82,7 @@ ExitCode Run(const Options &options) {
         Say("No folder is indexed.");
         return ExitCodeOf(state);
     }
-    Say("Nothing at " + Named(options.paths) + " is indexed.");
+    Say("Nothing is indexed at " + Named(options.paths) + ".");
     return kUnknown;
 }
 

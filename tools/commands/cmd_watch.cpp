@@ -20,13 +20,12 @@ namespace CTL {
 namespace {
 
 constexpr char kFooter[] =
-    R"(On a terminal one picture is drawn again and again, until Ctrl-C or q, but none
-while it is in the background; elsewhere a line is written whenever something
-has changed. With --json there is one object a line, for each look, however it
-is to be laid out.
+    R"(On a terminal the display is updated in place until Ctrl-C or q, except while in
+the background. Elsewhere a line is written for each change. With --json each
+update is one object on one line, even with --json=pretty.
 
-Exit status: 0 when it was ended by Ctrl-C, q, SIGTERM or --count; 1 failed,
-2 mistake in the call, 3 no such folder.
+Exit status: 0 when ended by Ctrl-C, q, SIGTERM or --count; 1 failed; 2 usage
+error; 3 no such folder.
 
 Examples:
   fileindexctl watch
@@ -133,7 +132,7 @@ ExitCode Run(const Options &options) {
         return Fail("Cannot read the settings");
     }
     if (!options.paths.empty() && observer.IsIdle()) {
-        Say("Nothing at " + Named(options.paths) + " is indexed.");
+        Say("Nothing is indexed at " + Named(options.paths) + ".");
         return kNotFound;
     }
     const std::unique_ptr<WatchOutput> output = OutputFor(options);
@@ -144,12 +143,12 @@ ExitCode Run(const Options &options) {
 
 Action DeclareWatch(CLI::App &app) {
     const auto options = std::make_shared<Options>();
-    AddPathsTo(app, options->paths, "Share paths or full paths; all folders without one")
+    AddPathsTo(app, options->paths, "Share paths or full paths; all folders by default")
         ->required(false)
         ->check(CheckFullPath);
-    app.add_option("--interval", options->interval, "Look so often; 1 if not given")
+    app.add_option("--interval", options->interval, "Time between updates; 1 by default")
         ->type_name("SECONDS");
-    app.add_option("--count", options->count, "End after so many looks")
+    app.add_option("--count", options->count, "End after N updates")
         ->type_name("N")
         ->check(CLI::PositiveNumber);
     AddJsonOption(app, options->json);

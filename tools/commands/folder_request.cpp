@@ -97,14 +97,14 @@ ExitCode Save(const Json::Value &request, const Wording &wording) {
         return IsSaved(request)
                    ? FailHalfWay(
                          Named(paths) + (paths.size() == 1 ? " is saved" : " are saved"),
-                         "fileindexctl doctor tells what is wrong; then repeat this command.")
+                         "fileindexctl doctor shows what is wrong; then repeat this command.")
                    : FailFor(request, wording);
     }
     Say(wording.done + (" " + Named(paths)) + ".");
     for (const std::string &path : paths) {
         if (const auto refusal = RefusalOf(path)) {
             Say(Shown(path) + " cannot be indexed as it is: " + refusal->why + ".");
-            Advise(refusal->mend);
+            Advise(refusal->fix);
         }
     }
     return kDone;

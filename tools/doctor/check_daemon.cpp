@@ -31,10 +31,10 @@ Finding NotRunning(const Evidence &evidence, const std::string &what) {
         finding = Error("daemon-stopped", kDaemonSocket, what)
                       .Because("Nothing is indexed. Folders that are set: " +
                                std::to_string(evidence.folders.size()) + ".")
-                      .Mend("Start it.", StartCommand());
+                      .Fix("Start it.", StartCommand());
     } else if (!evidence.areFoldersKnown) {
         finding = Warning("daemon-stopped", kDaemonSocket, what)
-                      .Mend("Mend the settings first, then start it.", StartCommand());
+                      .Fix("Fix the settings first, then start it.", StartCommand());
     }
     return finding;
 }
@@ -70,7 +70,7 @@ bool Answers(const UniqueFd &connection) {
 Finding Silent(const std::string &why) {
     return Error("daemon-silent", kDaemonSocket, "fileindexd does not answer on its socket")
         .Because(why)
-        .Mend("Look at what keeps it, or restart it.", StartCommand());
+        .Fix("Look at what keeps it, or restart it.", StartCommand());
 }
 
 Finding Running(const Evidence &evidence, const UniqueFd &connection) {
@@ -105,7 +105,7 @@ Findings CheckDaemon(const Evidence &evidence) {
             return {Error("daemon-socket", kDaemonSocket,
                           std::string(kDaemonSocket) + " is " + KindOf(look.info.st_mode))
                         .Because("The daemon cannot listen there.")
-                        .Mend("Move it away and restart the daemon.", StartCommand())};
+                        .Fix("Move it away and restart the daemon.", StartCommand())};
         }
         return {NotRunning(evidence, "Nobody listens on the socket that fileindexd left behind")};
     }

@@ -33,7 +33,7 @@ void LookAtFolder(Findings &findings, const Folder &folder) {
         findings.push_back(
             Error("folder-refused", folder.path, Shown(folder.path) + " cannot be indexed")
                 .Because(std::string("Rule ") + refusal->rule + ": " + refusal->why + ".")
-                .Mend(refusal->mend, ShowCommand(folder.path))
+                .Fix(refusal->fix, ShowCommand(folder.path))
                 .With("rule", refusal->rule)
                 .With("full_path", fullPath));
         return;
@@ -41,13 +41,13 @@ void LookAtFolder(Findings &findings, const Folder &folder) {
     if (DirectoryError(fullPath) == ENOTDIR) {
         findings.push_back(
             Warning("folder-file", folder.path, Shown(folder.path) + " is no directory")
-                .Mend("Set the directory that holds it.", ShowCommand(folder.path)));
+                .Fix("Set the directory that holds it.", ShowCommand(folder.path)));
     }
     if (!folder.document && !folder.audio && !folder.video && !folder.photo) {
         findings.push_back(
             Warning("folder-typeless", folder.path,
                     "Of " + Shown(folder.path) + " no file type is indexed")
-                .Mend("Choose some (set), or remove the folder.", ShowCommand(folder.path)));
+                .Fix("Choose some (set), or remove the folder.", ShowCommand(folder.path)));
     }
 }
 

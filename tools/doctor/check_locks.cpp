@@ -137,8 +137,8 @@ void LookAtLockFile(Findings &findings, const std::string &path, const struct st
     if (!S_ISREG(info.st_mode)) {
         findings.push_back(Error("lock-kind", path, path + " is " + KindOf(info.st_mode))
                                .Because("The settings cannot be locked, so not be changed.")
-                               .Mend("Remove it; it is made anew.",
-                                     S_ISDIR(info.st_mode) ? "rmdir " + path : remove));
+                               .Fix("Remove it; it is made anew.",
+                                    S_ISDIR(info.st_mode) ? "rmdir " + path : remove));
         return;
     }
     if (info.st_uid != 0) {
@@ -148,7 +148,7 @@ void LookAtLockFile(Findings &findings, const std::string &path, const struct st
                               : Warning("lock-owner", path, owner))
                 .Because("That user can hold the lock for ever, and the kernel may "
                          "keep root from such files in /tmp.")
-                .Mend("Remove it while nobody changes settings; it is made anew.", remove));
+                .Fix("Remove it while nobody changes settings; it is made anew.", remove));
     }
 }
 
@@ -187,8 +187,8 @@ Finding Held(const LockFile &file) {
                          ? "No setting can be changed while it is held; it was for a second."
                          : "Events for this queue are dropped while it is held; it was for a "
                            "second.")
-            .Mend("Let it end its work; if it hangs, end it.",
-                  isKnown ? "ps -fp " + std::to_string(file.holder) : "lsof " + Quoted(file.path));
+            .Fix("Let it end its work; if it hangs, end it.",
+                 isKnown ? "ps -fp " + std::to_string(file.holder) : "lsof " + Quoted(file.path));
     if (isKnown) {
         finding.details["pid"] = file.holder;
     }

@@ -50,15 +50,15 @@ Watches ReadWatches(Findings &findings) {
         const JsonFile file = ReadJsonFile(path);
         const std::optional<Finding> mistake = MistakeOf(file, "monitor");
         if (mistake) {
-            findings.push_back(Finding(*mistake).Mend("Have it written anew: resume its share.",
-                                                      "fileindexctl share resume --help"));
+            findings.push_back(Finding(*mistake).Fix("Have it written anew: resume its share.",
+                                                     "fileindexctl share resume --help"));
         } else if (file.value.isObject() && file.value["queue"].isString() &&
                    file.value["config"].isArray() && file.value["consumer"] == kConsumer) {
             watches[file.value["queue"].asString()] = {path, PathsIn(file.value["config"])};
         } else {
             findings.push_back(Error("monitor-shape", path, Shown(path) + " describes no queue")
-                                   .Mend("Have it written anew: resume its share.",
-                                         "fileindexctl share resume --help"));
+                                   .Fix("Have it written anew: resume its share.",
+                                        "fileindexctl share resume --help"));
         }
     }
     return watches;
@@ -102,7 +102,7 @@ void LookAtShare(Findings &findings, const KnownShare &share, const Watches &wat
                   "The monitor does not watch the share " + Shown(share.name))
                 .Because("Changes in its folders are not seen. A share that was paused is not "
                          "watched either.")
-                .Mend("Have its configuration written anew.", resume));
+                .Fix("Have its configuration written anew.", resume));
         return;
     }
     const std::set<std::string> wanted = FullPathsOf(share);
@@ -111,7 +111,7 @@ void LookAtShare(Findings &findings, const KnownShare &share, const Watches &wat
             Error("monitor-differs", share.name,
                   "The monitor watches other folders of " + Shown(share.name) + " than are set")
                 .Because(DifferenceOf(wanted, watch->second.paths))
-                .Mend("Have its configuration written anew.", resume)
+                .Fix("Have its configuration written anew.", resume)
                 .With("file", watch->second.file));
     }
 }
@@ -127,8 +127,8 @@ void LookForSurplus(Findings &findings, const Evidence &evidence, Watches watche
             Warning("monitor-surplus", watch.file,
                     "The monitor watches for a share without folders: " + Shown(queue))
                 .Because("Its queue grows and nobody reads it.")
-                .Mend("Remove the file, or set the folders again if they were lost.",
-                      "rm " + Quoted(watch.file))
+                .Fix("Remove the file, or set the folders again if they were lost.",
+                     "rm " + Quoted(watch.file))
                 .With("queue", queue));
     }
 }

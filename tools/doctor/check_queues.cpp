@@ -94,7 +94,7 @@ void JudgeContent(Findings &findings, const QueueLook &look, const std::string &
                     Shown(path) +
                         " holds lines that are no events: " + std::to_string(look.malformed))
                 .Because("They are passed over, and what they meant is lost.")
-                .Mend("Index the share's folders again.", ReindexCommand(share)),
+                .Fix("Index the share's folders again.", ReindexCommand(share)),
             look));
     }
 }
@@ -104,7 +104,7 @@ void JudgeSize(Findings &findings, const QueueLook &look, const std::string &pat
         findings.push_back(WithCounts(
             Warning("queue-long", path, Shown(path) + " is long: " + EventsOf(look))
                 .Because("The daemon does not keep up (beyond 16 MiB or 100000 events).")
-                .Mend("Look whether it runs and what it logs.", "fileindexctl doctor daemon"),
+                .Fix("Look whether it runs and what it logs.", "fileindexctl doctor daemon"),
             look));
     }
 }
@@ -116,7 +116,7 @@ void JudgeAge(Findings &findings, const QueueLook &look, const std::string &path
             Warning("queue-old", path,
                     Shown(path) + ": the oldest event has waited for " + Duration(look.age))
                 .Because(patience.atAnEnd)
-                .Mend("Look whether it runs and what it logs.", "fileindexctl doctor daemon"),
+                .Fix("Look whether it runs and what it logs.", "fileindexctl doctor daemon"),
             look));
     }
 }
@@ -124,7 +124,7 @@ void JudgeAge(Findings &findings, const QueueLook &look, const std::string &path
 Finding WrongKind(const std::string &path, mode_t mode) {
     return Error("queue-kind", path, Shown(path) + " is " + KindOf(mode))
         .Because("No event can be queued there.")
-        .Mend("Move it out of the way.", "mv " + Quoted(path) + " " + Quoted(path + ".odd"));
+        .Fix("Move it out of the way.", "mv " + Quoted(path) + " " + Quoted(path + ".odd"));
 }
 
 // Whether the queues can be looked for in the directory that should hold them.

@@ -48,7 +48,7 @@ void LookAtRoom(Findings &findings, const KnownShare &share) {
             Error("share-full", share.name,
                   "The share " + Shown(share.name) + " is full: not even 10 MiB can be written")
                 .Because("Its index cannot be kept. A quota may be the reason.")
-                .Mend("Make room, or raise the quota.", "df -h " + Quoted(share.directory))
+                .Fix("Make room, or raise the quota.", "df -h " + Quoted(share.directory))
                 .With("free", Json::UInt64(room->free))
                 .With("size", Json::UInt64(room->size)));
     } else if (room->IsScarce()) {
@@ -56,7 +56,7 @@ void LookAtRoom(Findings &findings, const KnownShare &share) {
             Warning("share-nearly-full", share.name,
                     "The share " + Shown(share.name) + " is nearly full: " + Size(room->free) +
                         " of " + Size(room->size) + " left")
-                .Mend("Make room for the index to grow.", "df -h " + Quoted(share.directory))
+                .Fix("Make room for the index to grow.", "df -h " + Quoted(share.directory))
                 .With("free", Json::UInt64(room->free))
                 .With("size", Json::UInt64(room->size)));
     }
@@ -70,8 +70,8 @@ void LookAtMarks(Findings &findings, const KnownShare &share) {
                                  "The share " + Shown(share.name) + " is marked as out of space")
                                .Because(isEnough ? "Its indexing has stopped. There is room again."
                                                  : "Its indexing has stopped.")
-                               .Mend(isEnough ? "Let it go on." : "Make room, then let it go on.",
-                                     ReindexCommand(share)));
+                               .Fix(isEnough ? "Let it go on." : "Make room, then let it go on.",
+                                    ReindexCommand(share)));
     }
     if (StatusMgr::ShareIsNeedReindex(share.name)) {
         findings.push_back(
@@ -79,7 +79,7 @@ void LookAtMarks(Findings &findings, const KnownShare &share) {
                     "The share " + Shown(share.name) + " is marked as needing a new index")
                 .Because("An event could not be queued, so its index lacks "
                          "something.")
-                .Mend("Index its folders again.", ReindexCommand(share)));
+                .Fix("Index its folders again.", ReindexCommand(share)));
     }
 }
 

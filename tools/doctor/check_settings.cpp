@@ -12,7 +12,7 @@ namespace CTL::DOCTOR {
 
 namespace {
 
-constexpr char kRestore[] = "Mend it by hand, or bring it back from a backup. Moved away, it "
+constexpr char kRestore[] = "Fix it by hand, or restore it from a backup. Moved away, it "
                             "counts as empty.";
 constexpr std::size_t kMaxFolders = 1000;
 
@@ -33,7 +33,7 @@ bool LookAtDirectory(Findings &findings) {
                   std::string(kSettingsDirectory) +
                       (error == ENOTDIR ? " is no directory" : " does not exist"))
                 .Because("No setting can be saved.")
-                .Mend("Make it.", std::string("mkdir -p -m 755 ") + kSettingsDirectory));
+                .Fix("Make it.", std::string("mkdir -p -m 755 ") + kSettingsDirectory));
         return false;
     }
     struct stat info {};
@@ -55,8 +55,8 @@ void LookAtOwner(Findings &findings, const std::string &path) {
             Warning("settings-link", path, path + " is a symbolic link")
                 .Because("It is then rewritten in place: a full disk or a lost "
                          "power line can leave half of it.")
-                .Mend("Put the file itself there.",
-                      "cp --remove-destination \"$(readlink -f " + path + ")\" " + path));
+                .Fix("Put the file itself there.",
+                     "cp --remove-destination \"$(readlink -f " + path + ")\" " + path));
     }
 }
 
@@ -65,13 +65,13 @@ bool LookAtJson(Findings &findings, const JsonFile &file) {
     const std::optional<Finding> mistake = MistakeOf(file, "settings");
     if (mistake) {
         const bool isReadable = file.state == JsonFile::State::kMalformed;
-        findings.push_back(isReadable ? Finding(*mistake).Mend(kRestore, EditCommand(file.path))
+        findings.push_back(isReadable ? Finding(*mistake).Fix(kRestore, EditCommand(file.path))
                                       : *mistake);
         return false;
     }
     if (file.state == JsonFile::State::kGood && !file.value.isObject()) {
         findings.push_back(Error("settings-shape", file.path, file.path + " is no JSON object")
-                               .Mend(kRestore, EditCommand(file.path)));
+                               .Fix(kRestore, EditCommand(file.path)));
         return false;
     }
     return true;
@@ -106,7 +106,7 @@ void LookAtFolders(Findings &findings, const JsonFile &file) {
                 Warning("settings-member", path,
                         "The folder " + Shown(path) + " is set oddly: " + member)
                     .Because("What cannot be read counts as no.")
-                    .Mend("Set it anew (set, with a name and all types).", ShowCommand(path)));
+                    .Fix("Set it anew (set, with a name and all types).", ShowCommand(path)));
         }
     }
     if (file.value.size() > kMaxFolders) {
@@ -114,7 +114,7 @@ void LookAtFolders(Findings &findings, const JsonFile &file) {
             Warning("settings-limit", file.path,
                     Count(file.value.size(), "folder") + " are set; 1000 is the most")
                 .Because("No further one can be added.")
-                .Mend("Remove some.", "fileindexctl list"));
+                .Fix("Remove some.", "fileindexctl list"));
     }
     if (odd == 0) {
         findings.push_back(
@@ -141,16 +141,15 @@ void LookAtStatus(Findings &findings, const JsonFile &file) {
         findings.push_back(
             Error("settings-member", "resume_time", "status.conf: \"resume_time\" is no number")
                 .Because("Nobody can tell whether indexing is paused.")
-                .Mend("Set it anew.", "fileindexctl resume"));
+                .Fix("Set it anew.", "fileindexctl resume"));
     }
     for (const char *marks : {"no_space", "need_reindex"}) {
         const Json::Value &member = file.value[marks];
         if (!member.isObject() && !member.isNull()) {
-            findings.push_back(
-                Error("settings-member", marks,
-                      std::string("status.conf: \"") + marks + "\" is no object")
-                    .Because("No share can be marked.")
-                    .Mend("Take that member out by hand.", EditCommand(kStatusConf)));
+            findings.push_back(Error("settings-member", marks,
+                                     std::string("status.conf: \"") + marks + "\" is no object")
+                                   .Because("No share can be marked.")
+                                   .Fix("Take that member out by hand.", EditCommand(kStatusConf)));
         }
     }
     if (findings.size() == before) {

@@ -43,8 +43,8 @@ void LookAtTable(Findings &findings, const Evidence &evidence) {
     if (mistake) {
         findings.push_back(mistake->severity == Severity::kUnknown
                                ? *mistake
-                               : Finding(*mistake).Mend("Until it is mended there are no shares.",
-                                                        std::string("editor ") + kShareTable));
+                               : Finding(*mistake).Fix("Until it is fixed there are no shares.",
+                                                       std::string("editor ") + kShareTable));
         return;
     }
     if (table.state == JsonFile::State::kMissing) {
@@ -52,15 +52,15 @@ void LookAtTable(Findings &findings, const Evidence &evidence) {
         findings.push_back((evidence.HasFolders()
                                 ? Error("share-table-missing", kShareTable, what)
                                 : Warning("share-table-missing", kShareTable, what))
-                               .Mend(R"(Write one: {"photos": "/volume1/photos"})",
-                                     std::string("editor ") + kShareTable));
+                               .Fix(R"(Write one: {"photos": "/volume1/photos"})",
+                                    std::string("editor ") + kShareTable));
         return;
     }
     if (!table.value.isObject()) {
         findings.push_back(
             Error("share-table-shape", kShareTable, std::string(kShareTable) + " is no JSON object")
-                .Mend("Until it is mended there are no shares.",
-                      std::string("editor ") + kShareTable));
+                .Fix("Until it is fixed there are no shares.",
+                     std::string("editor ") + kShareTable));
         return;
     }
     const FileLook look(kShareTable);
@@ -76,7 +76,7 @@ void LookAtShare(Findings &findings, const KnownShare &share, const Json::Value 
             Error("share-left-out", share.name,
                   "The share " + Shown(share.name) + " is left out of the table")
                 .Because("Of its entry: " + MistakeIn(share.name, table[share.name]) + ".")
-                .Mend("Mend the entry.", std::string("editor ") + kShareTable));
+                .Fix("Fix the entry.", std::string("editor ") + kShareTable));
         return;
     }
     if (share.directory.empty() && !table.isObject()) {
@@ -87,8 +87,8 @@ void LookAtShare(Findings &findings, const KnownShare &share, const Json::Value 
             Error("share-unknown", share.name,
                   "There is no share " + Shown(share.name) + ", but folders of it are set")
                 .Because("It was removed or renamed without the index being told.")
-                .Mend("Drop its folders, or move them to its new name (share rename).",
-                      "fileindexctl share remove " + Quoted(share.name)));
+                .Fix("Drop its folders, or move them to its new name (share rename).",
+                     "fileindexctl share remove " + Quoted(share.name)));
         return;
     }
     const int error = DirectoryError(share.directory);
@@ -104,8 +104,8 @@ void LookAtShare(Findings &findings, const KnownShare &share, const Json::Value 
     findings.push_back((share.folders.empty() ? Warning("share-gone", share.name, what)
                                               : Error("share-gone", share.name, what))
                            .Because(Reason(error) + ".")
-                           .Mend("Mount its volume, or take the share out of the table.",
-                                 "findmnt; ls -ld " + Quoted(share.directory))
+                           .Fix("Mount its volume, or take the share out of the table.",
+                                "findmnt; ls -ld " + Quoted(share.directory))
                            .With("directory", share.directory));
 }
 

@@ -16,14 +16,14 @@ Findings CheckSpotlight(const Evidence &evidence) {
     if (!isKnown) {
         return {Warning("spotlight-unknown", "", "Samba cannot be asked for Spotlight")
                     .Because("It is not installed, or refuses its own configuration.")
-                    .Mend("Install it, or mend what it complains of.", "testparm -s")};
+                    .Fix("Install it, or fix what it complains of.", "testparm -s")};
     }
     if (!isOn) {
         return {Warning("spotlight-off", "", "Spotlight is off although folders are set")
                     .Because("The shares' users cannot search the index.")
-                    .Mend("smb.conf needs \"include = registry\", and no \"spotlight\" of its own "
-                          "after it.",
-                          "net conf setparm global spotlight yes")};
+                    .Fix("smb.conf needs \"include = registry\", and no \"spotlight\" of its own "
+                         "after it.",
+                         "net conf setparm global spotlight yes")};
     }
     return {Ok("spotlight-on", "", "Spotlight is on")};
 }

@@ -67,22 +67,22 @@ void FindOddOwner(Findings &findings, const std::string &path, const struct stat
         findings.push_back(Warning("odd-owner", path,
                                    Shown(path) + " belongs to user " + std::to_string(info.st_uid))
                                .Because("It is root's; whoever owns it can change the service.")
-                               .Mend("Give it back.", "chown root: " + Quoted(path)));
+                               .Fix("Give it back.", "chown root: " + Quoted(path)));
     }
     if ((info.st_mode & (S_IWGRP | S_IWOTH)) != 0) {
         findings.push_back(
             Warning("odd-mode", path,
                     Shown(path) + " can be changed by others: mode " + Octal(info.st_mode))
-                .Mend("Let root alone write to it.",
-                      std::string("chmod ") + goodMode + " " + Quoted(path)));
+                .Fix("Let root alone write to it.",
+                     std::string("chmod ") + goodMode + " " + Quoted(path)));
     } else if ((info.st_mode & S_IROTH) == 0) {
         findings.push_back(
             Warning("odd-mode", path,
                     Shown(path) + " cannot be read by others: mode " + Octal(info.st_mode))
                 .Because("Programs that do not run as root are told that nothing "
                          "is indexed.")
-                .Mend("Let everybody read it.",
-                      std::string("chmod ") + goodMode + " " + Quoted(path)));
+                .Fix("Let everybody read it.",
+                     std::string("chmod ") + goodMode + " " + Quoted(path)));
     }
 }
 
@@ -99,7 +99,7 @@ void FindStrayFiles(Findings &findings, const std::string &directory, const std:
         findings.push_back(
             Warning("stray-file", path, Shown(path) + " was left behind " + Duration(age) + " ago")
                 .Because("A program was killed while it saved the file beside it.")
-                .Mend("Remove it.", "rm " + Quoted(path)));
+                .Fix("Remove it.", "rm " + Quoted(path)));
     }
 }
 

@@ -35,8 +35,8 @@ Finding &&Finding::Because(std::string text) && {
     return std::move(*this);
 }
 
-Finding &&Finding::Mend(std::string text, std::string line) && {
-    mend = std::move(text);
+Finding &&Finding::Fix(std::string text, std::string line) && {
+    fix = std::move(text);
     command = std::move(line);
     return std::move(*this);
 }
@@ -65,13 +65,13 @@ Finding Error(std::string code, std::string subject, std::string what) {
 Finding Unreadable(std::string code, const std::string &path, int error) {
     if (IsForRootOnly(error)) {
         return Unknown("needs-root", path, Shown(path) + " can be looked at by root only")
-            .Mend("Ask again as root.", "sudo fileindexctl doctor");
+            .Fix("Ask again as root.", "sudo fileindexctl doctor");
     }
     // What reads files refuses other kinds so.
     const std::string what =
         error == EINVAL ? " is no regular file" : " cannot be read: " + Reason(error);
     return Error(std::move(code), path, Shown(path) + what)
-        .Mend("Look at its kind, its owner and its mode.", "ls -ld " + Quoted(path));
+        .Fix("Look at its kind, its owner and its mode.", "ls -ld " + Quoted(path));
 }
 
 std::string Quoted(const std::string &word) {

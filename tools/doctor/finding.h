@@ -24,14 +24,14 @@ struct Finding {
     std::string what;
     std::string why;
     std::vector<std::string> quote;                       // lines to be shown as they are
-    std::string mend;                                     // what to do about it
+    std::string fix;                                      // what to do about it
     std::string command;                                  // a command line towards that
     Json::Value details = Json::Value(Json::objectValue); // further facts for scripts
 
     Finding &&Because(std::string text) &&;
     // Whoever runs a command line without reading the text must not change what is indexed: where
     // only that would help, it looks closer, or there is none.
-    Finding &&Mend(std::string text, std::string line = {}) &&;
+    Finding &&Fix(std::string text, std::string line = {}) &&;
     Finding &&With(const char *key, const Json::Value &value) &&;
 };
 

@@ -51,7 +51,7 @@ void PrintFinding(const Finding &finding) {
     for (const std::string &line : finding.quote) {
         std::cout << std::string(kCommandIndent, ' ') << line << '\n';
     }
-    PrintParagraph(finding.mend);
+    PrintParagraph(finding.fix);
     if (!finding.command.empty()) {
         std::cout << std::string(kCommandIndent, ' ')
                   << Coloured(finding.command, Colour::kBold, MayUseColour()) << '\n';
@@ -101,7 +101,7 @@ Json::Value AsJson(const Finding &finding, const Check &check) {
     object["subject"] = finding.subject;
     object["what"] = finding.what;
     object["why"] = finding.why;
-    object["mend"] = finding.mend;
+    object["fix"] = finding.fix;
     object["command"] = finding.command;
     return object;
 }

@@ -32,7 +32,7 @@ CLI::Option *AddPathsTo(CLI::App &app, std::vector<std::string> &paths, const ch
 
 std::string CheckSharePath(const std::string &path) {
     if (path.size() < 2 || path[0] != '/' || path[1] == '/') {
-        return "'" + path + "' is no share path: it begins with /SHARE";
+        return "'" + path + "' is not a share path: those begin with /SHARE";
     }
     return {};
 }
@@ -49,7 +49,7 @@ std::string CheckFolderPath(const std::string &path) {
     const std::string inner = path + "/";
     for (const char *part : {"//", "/./", "/../"}) {
         if (inner.find(part) != std::string::npos) {
-            return "'" + path + "' is not plain: leave out doubled and final slashes, . and ..";
+            return "'" + path + "' is not plain: remove double and trailing slashes, . and ..";
         }
     }
     return {};

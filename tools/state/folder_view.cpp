@@ -7,22 +7,11 @@ namespace CTL {
 
 using VANO::FILEINDEX::Folder;
 
-namespace {
-
-Json::Value AdditionalKeys() {
+Json::Value FolderFacts() {
     Json::Value keys(Json::arrayValue);
     keys.append("status");
     keys.append("is_valid");
     return keys;
-}
-
-} // namespace
-
-Json::Value WithFacts(const Json::Value &folder) {
-    Folder record;
-    // A share that is gone shows in the facts.
-    (void)record.Reload(folder["path"].asString(), folder);
-    return record.asJson(AdditionalKeys());
 }
 
 std::string TypesOf(const Json::Value &folder) {
@@ -49,7 +38,7 @@ Json::Value AsJson(const std::optional<Refusal> &refusal) {
     if (refusal) {
         value["rule"] = refusal->rule;
         value["why"] = refusal->why;
-        value["mend"] = refusal->mend;
+        value["fix"] = refusal->fix;
     }
     return value;
 }

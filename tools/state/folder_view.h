@@ -14,8 +14,9 @@ namespace CTL {
 
 inline constexpr std::array<const char *, 4> kFileTypes = {"document", "audio", "video", "photo"};
 
-// A folder of a list with the facts that the library tells beside the setting itself.
-[[nodiscard]] Json::Value WithFacts(const Json::Value &folder);
+// The facts beside the setting itself that are asked of the library, as Folder::asJson() takes
+// them.
+[[nodiscard]] Json::Value FolderFacts();
 
 // "photo,video" of a folder's JSON object.
 [[nodiscard]] std::string TypesOf(const Json::Value &folder);
@@ -23,7 +24,7 @@ inline constexpr std::array<const char *, 4> kFileTypes = {"document", "audio", 
 // The folder's status in words, from its "additional" facts.
 [[nodiscard]] std::string StatusOf(const Json::Value &folder);
 
-// {"rule", "why", "mend"}; null when there is none.
+// {"rule", "why", "fix"}; null when there is none.
 [[nodiscard]] Json::Value AsJson(const std::optional<Refusal> &refusal);
 
 [[nodiscard]] std::vector<std::string> PathsOf(const std::vector<VANO::FILEINDEX::Folder> &folders);

@@ -23,43 +23,41 @@ std::optional<Refusal> ByPlace(const std::string &fullPath) {
     if (fullPath.find("#recycle") != std::string::npos &&
         VANOShareIsShareRecycle(fullPath.c_str()) != 0) {
         return Refusal{"recycle-bin", "it lies in the share's recycle bin",
-                       "Set a folder outside the bin."};
+                       "Choose a folder outside the bin."};
     }
     int flag = 0;
     if (fullPath.find("#snapshot") != std::string::npos &&
         VLIBFhsPathInSnapshot(fullPath.c_str(), &flag) == 0 && flag == 1) {
-        return Refusal{"snapshot", "it lies in a snapshot", "Set the folder itself, not its past."};
+        return Refusal{"snapshot", "it lies in a snapshot",
+                       "Choose the folder itself, not a snapshot of it."};
     }
     return std::nullopt;
 }
 
 std::optional<Refusal> ByFileSystem(const std::string &fullPath) {
-    const char *const mend = "Move the folder to a disk of this system.";
+    const char *const fix = "Move the folder to a local disk.";
     const int type = VANOGetFSType(fullPath.c_str(), 0);
     struct stat info {};
     if (type == -1 && ::stat(fullPath.c_str(), &info) != 0) {
         const bool isGone = errno == ENOENT || errno == ENOTDIR;
         return Refusal{isGone ? "missing" : "unreachable",
-                       isGone ? "there is no such directory: " + Shown(fullPath)
+                       isGone ? "the directory does not exist: " + Shown(fullPath)
                               : "it cannot be reached: " + std::generic_category().message(errno),
-                       isGone ? "Make it, mount its volume, or remove the folder's setting."
-                              : "Look at the modes of the directories above it."};
+                       isGone ? "Create it, mount its volume, or remove the folder's setting."
+                              : "Check the permissions of the directories above it."};
     }
     if (type == -1) {
-        return Refusal{"file-system-unknown", "its file system is of an unknown kind", mend};
+        return Refusal{"file-system-unknown", "the type of its file system is unknown", fix};
     }
     if (VANOFSIsRemoteFS(type) != 0) {
         return Refusal{"file-system-remote",
-                       "it lies on another machine, whose changes are not "
-                       "seen here",
-                       mend};
+                       "it is on another machine, and changes there cannot be watched", fix};
     }
     if (VANOFSIsImageFS(type) != 0) {
-        return Refusal{"file-system-image", "it lies on a mounted disk image", mend};
+        return Refusal{"file-system-image", "it is on a mounted disk image", fix};
     }
     if (type == kUserSpaceFileSystem) {
-        return Refusal{"file-system-user-space",
-                       "its file system is run by a user's program (FUSE)", mend};
+        return Refusal{"file-system-user-space", "its file system is a user-space one (FUSE)", fix};
     }
     return std::nullopt;
 }
@@ -78,12 +76,13 @@ std::optional<Refusal> ByShare(_tag_VANOSHARE *share) {
                        "Remove the folder's setting: encrypted shares are not indexed."};
     }
     if (readOnly != 0) {
-        return Refusal{"share-read-only", "its share is read-only, and the index lies in the share",
+        return Refusal{"share-read-only",
+                       "its share is read-only, and the index is stored in the share",
                        "Make the share writable, or remove the folder's setting."};
     }
     if (!isTold) {
         return Refusal{"share-unreadable", "the properties of its share cannot be read",
-                       "Look at the system log."};
+                       "See the system log."};
     }
     return Refusal{"share-excluded", "shares named " + Shown(share->name) + " are never indexed",
                    "Remove the folder's setting."};
@@ -93,8 +92,8 @@ std::optional<Refusal> ByMount(_tag_VANOSHARE *share, const std::string &fullPat
     int encryption = 0;
     if (VANOFSDirIsMntPoint(fullPath.c_str()) == 1 &&
         VLIBShareIsEncryptionGet(share, &encryption) == 0 && encryption == 0) {
-        return Refusal{"mount-point", "it is a mount point of its own",
-                       "Make a share of what is mounted there, or set folders below it."};
+        return Refusal{"mount-point", "it is a mount point",
+                       "Create a share for what is mounted there, or choose folders below it."};
     }
     return std::nullopt;
 }
@@ -103,14 +102,14 @@ std::optional<Refusal> BySpelling(const std::string &fullPath) {
     std::array<char, PATH_MAX> canonical{};
     if (::realpath(fullPath.c_str(), canonical.data()) == nullptr) {
         return Refusal{"not-canonical",
-                       "it cannot be followed: " + std::generic_category().message(errno),
-                       "Look at the directories above it."};
+                       "it cannot be resolved: " + std::generic_category().message(errno),
+                       "Check the directories above it."};
     }
     if (fullPath != canonical.data()) {
         return Refusal{"not-canonical",
-                       "its path has symbolic links or other detours; it leads to " +
+                       "its path has symbolic links or the like; the real path is " +
                            Shown(canonical.data()),
-                       "Set the folder by its plain path."};
+                       "Use the real path."};
     }
     return std::nullopt;
 }
@@ -120,7 +119,7 @@ std::optional<Refusal> FirstRefusal(const std::string &sharePath) {
     std::string fullPath;
     if (!VANO::FILEINDEX::GetFullPath(fullPath, sharePath)) {
         return Refusal{"no-share", "there is no share of that name",
-                       "Bring the share back, or remove the folder's setting."};
+                       "Restore the share, or remove the folder's setting."};
     }
     std::optional<Refusal> refusal = ByPlace(fullPath);
     if (!refusal) {
@@ -132,12 +131,12 @@ std::optional<Refusal> FirstRefusal(const std::string &sharePath) {
     std::string shareName;
     std::string inside;
     if (!VANO::FILEINDEX::GetShareNamePathByFullPath(shareName, inside, fullPath)) {
-        return Refusal{"no-share", "its directory lies in no share",
-                       "Look at the share's name and directory."};
+        return Refusal{"no-share", "its directory is not in a share",
+                       "Check the share's name and directory."};
     }
     const ShareRecord share = FindShare(shareName);
     if (!share) {
-        return Refusal{"no-share", "its share is unknown", "Look at the share's name."};
+        return Refusal{"no-share", "its share is unknown", "Check the share's name."};
     }
     refusal = ByShare(share.get());
     if (!refusal) {
@@ -154,7 +153,7 @@ std::optional<Refusal> RefusalOf(const std::string &sharePath) {
     }
     std::optional<Refusal> refusal = FirstRefusal(sharePath);
     if (!refusal) {
-        refusal = Refusal{"other", "the service refuses it", "Look at the system log."};
+        refusal = Refusal{"other", "the service refuses it", "See the system log."};
     }
     return refusal;
 }

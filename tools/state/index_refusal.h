@@ -10,7 +10,7 @@ namespace CTL {
 struct Refusal {
     const char *rule; // its name, for scripts: "mount-point"
     std::string why;  // a clause, fit for a terminal: "it is a mount point of its own"
-    const char *mend; // what to do about it
+    const char *fix;  // what to do about it
 };
 
 // None when the folder may be indexed. Looks only.

@@ -51,7 +51,7 @@ std::vector<std::string> NotesOf(const ServiceState &state) {
             notes.push_back(name + " is out of space");
         }
         if (share.needsReindex) {
-            notes.push_back(name + " needs a new index");
+            notes.push_back(name + " needs reindexing");
         }
         if (share.queueError != 0) {
             notes.push_back(name +

@@ -48,36 +48,37 @@ int LockFileError() {
 Explanation ExplanationOf(fileindex::_tag_fileindex_err_ code) {
     switch (code) {
     case fileindex::FILEINDEX_ERR_BAD_PARAM:
-        return {"a path or a value of the request cannot be used", "Check how the path is spelt."};
+        return {"a path or value in the request is invalid", "Check the spelling of the path."};
     case fileindex::FILEINDEX_ERR_PATH:
-        return {"no share has that name", "Paths begin with /SHARE; check how the share is spelt."};
+        return {"no share has that name",
+                "Paths begin with /SHARE; check the spelling of the share."};
     case fileindex::FILEINDEX_ERR_NO_SUCH_FOLDER:
-        return {"no such folder is set", "fileindexctl list shows those that are."};
+        return {"the folder is not indexed", "fileindexctl list shows the indexed folders."};
     case fileindex::FILEINDEX_ERR_FOLDER_LIMIT:
-        return {"1000 folders are set, which is the most", "Remove one first."};
+        return {"the limit of 1000 folders is reached", "Remove one first."};
     case fileindex::FILEINDEX_ERR_LOAD:
-        return {"a settings file cannot be read or is no JSON",
+        return {"a settings file cannot be read or is not valid JSON",
                 "fileindexctl doctor settings shows where."};
     case fileindex::FILEINDEX_ERR_SAVE:
         return {"a settings file cannot be written",
-                "Check room and permissions of /usr/vano/etc/fileindex, or ask fileindexctl "
-                "doctor settings."};
+                "Check free space and permissions of /usr/vano/etc/fileindex, or run "
+                "fileindexctl doctor settings."};
     case fileindex::FILEINDEX_ERR_MALFORMED:
-        return {"a settings file does not hold what it should",
+        return {"a settings file has unexpected content",
                 "fileindexctl doctor settings shows where."};
     case fileindex::FILEINDEX_ERR_LOCK:
         if (const int error = LockFileError()) {
             return {"a lock file cannot be opened: " + std::generic_category().message(error),
-                    "fileindexctl doctor locks looks at it."};
+                    "Run fileindexctl doctor locks."};
         }
-        return {"the settings are locked", "Another program may be changing them: try again. "
-                                           "fileindexctl doctor locks tells which."};
+        return {"the settings are locked", "Another program may be changing them: try again, or "
+                                           "run fileindexctl doctor locks."};
     case fileindex::FILEINDEX_ERR_NONE:
     case fileindex::FILEINDEX_ERR_RESERVED:
         break;
     }
-    return {"a part of the indexing service does not answer or cannot be changed",
-            "fileindexctl doctor and the system log tell which."};
+    return {"part of the indexing service does not respond or cannot be changed",
+            "fileindexctl doctor and the system log say more."};
 }
 
 bool IsUnreadable(const std::string &path) {
@@ -136,7 +137,7 @@ ExitCode Fail(const std::string &what) {
 }
 
 ExitCode FailHalfWay(const std::string &what, const std::string &advice) {
-    Say(what + ", but not every part of the indexing service followed" + PlatformError() + ".");
+    Say(what + ", but not every part of the indexing service was updated" + PlatformError() + ".");
     Advise(advice);
     return kFailed;
 }
@@ -175,7 +176,8 @@ std::string Named(const std::vector<std::string> &paths) {
 }
 
 std::string NamedNotSet(const std::vector<std::string> &paths) {
-    return Named(paths) + (paths.size() == 1 ? " is not set" : " are not set");
+    return Named(paths) +
+           (paths.size() == 1 ? " is not an indexed folder" : " are not indexed folders");
 }
 
 } // namespace CTL

@@ -31,7 +31,7 @@ ExitCode Fail(const std::string &what);
 
 // Where the daemon did not hear of a change that was saved.
 constexpr char kDaemonAdvice[] =
-    "The daemon could not be told: is fileindexd running? fileindexctl doctor daemon tells more.";
+    "The daemon could not be told: is fileindexd running? Run fileindexctl doctor daemon.";
 
 // Where the settings did change and only the service did not follow: says so.
 ExitCode FailHalfWay(const std::string &what, const std::string &advice);
@@ -66,7 +66,7 @@ template <typename Act>
 // Paths for a message: "/a, /b and 3 more".
 [[nodiscard]] std::string Named(const std::vector<std::string> &paths);
 
-// "/a is not set", or "/a, /b are not set".
+// "/a is not an indexed folder", or "/a, /b are not indexed folders".
 [[nodiscard]] std::string NamedNotSet(const std::vector<std::string> &paths);
 
 } // namespace CTL

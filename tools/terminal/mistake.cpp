@@ -103,7 +103,7 @@ void SayUnexpected(const CLI::App &app, const std::string &word) {
         Say("There is no command '" + Shown(word) + "'.");
         Suggest(word, commands);
     } else {
-        Say("Surplus argument '" + Shown(word) + "'.");
+        Say("Unexpected argument '" + Shown(word) + "'.");
     }
 }
 

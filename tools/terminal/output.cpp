@@ -21,19 +21,7 @@ std::string JsonModeNumber(const std::string &word) {
             return std::to_string(static_cast<int>(mode));
         }
     }
-    throw CLI::ValidationError("it is short, pretty or off, not '" + word + "'");
-}
-
-// JSON as people write it: a bracket stands behind its key, not below. No name holds a bare line
-// break, so that those found here are the writer's own.
-std::string BracketsRaised(const std::string &text) {
-    std::string raised;
-    std::size_t position = 0;
-    for (std::size_t end = 0; (end = text.find(": \n", position)) != std::string::npos;) {
-        raised.append(text, position, end + 2 - position);
-        position = text.find_first_not_of(' ', end + 3);
-    }
-    return raised + text.substr(position);
+    throw CLI::ValidationError("must be short, pretty or off, not '" + word + "'");
 }
 
 std::vector<GridColumn> ColumnsUnder(const std::vector<std::string> &headings) {
@@ -49,12 +37,12 @@ std::vector<GridColumn> ColumnsUnder(const std::vector<std::string> &headings) {
 void AddJsonOption(CLI::App &app, JsonMode &mode) {
     // A flag, so that the word after a plain --json is not taken for its value.
     CLI::Option *json =
-        app.add_flag("--json{short}", mode, "Answer in JSON: on one line (short), indented or not");
+        app.add_flag("--json{short}", mode, "Print JSON: on one line (short), indented, or not");
     json->transform(JsonModeNumber)->type_name("short|pretty|off");
     app.add_flag_callback(
            "-j",
            [&mode] { mode = IsTerminal(STDOUT_FILENO) ? JsonMode::kPretty : JsonMode::kShort; },
-           "Answer in JSON: pretty on a terminal, short elsewhere")
+           "Print JSON: pretty on a terminal, short elsewhere")
         ->excludes(json);
 }
 
@@ -66,7 +54,7 @@ void PrintJson(const Json::Value &value, JsonMode mode) {
     builder["indentation"] = mode == JsonMode::kPretty ? "  " : "";
     builder["enableYAMLCompatibility"] = mode == JsonMode::kPretty; // "key": value
     builder["emitUTF8"] = true;
-    std::cout << ShownJson(BracketsRaised(Json::writeString(builder, value))) << '\n';
+    std::cout << ShownJson(Json::writeString(builder, value)) << '\n';
 }
 
 void PrintGrid(const Grid &grid) {

@@ -18,8 +18,8 @@ constexpr char kLeave[] = "\033[?25h\033[?1049l";
 constexpr char kHome[] = "\033[H";
 constexpr char kClearLine[] = "\033[K";
 constexpr char kClearBelow[] = "\033[J";
-constexpr char kEnding[] = "q or Ctrl-C ends.";
-constexpr char kCounting[] = "Counting what waits: ";
+constexpr char kEnding[] = "Press q or Ctrl-C to end.";
+constexpr char kCounting[] = "Counting pending events: ";
 
 // Past the buffers of the standard streams, so that a picture is written whole.
 bool Write(std::string_view text) {
