@@ -25,7 +25,8 @@ namespace {
 using namespace VANO::FILEINDEX;
 using namespace VANO::FUZZ;
 using VANO::PLATFORM::CaseFoldKey;
-using VANO::PLATFORM::ShareFromEntry;
+using VANO::PLATFORM::ReadTableEntry;
+using VANO::PLATFORM::TableShare;
 
 constexpr char kTable[] = "/usr/vano/etc/shares.json";
 
@@ -50,14 +51,15 @@ std::map<std::string, std::string> NaiveShares(const std::optional<Json::Value> 
         return shares;
     }
     for (const std::string &name : table->getMemberNames()) {
-        const auto share = ShareFromEntry(name, (*table)[name]);
-        if (!share || std::count(names.begin(), names.end(), CaseFoldKey(name)) != 0 ||
-            std::count(paths.begin(), paths.end(), share->path) != 0) {
+        TableShare share;
+        if (ReadTableEntry(share, name, (*table)[name]) != nullptr ||
+            std::count(names.begin(), names.end(), CaseFoldKey(name)) != 0 ||
+            std::count(paths.begin(), paths.end(), share.path) != 0) {
             continue;
         }
         names.push_back(CaseFoldKey(name));
-        paths.push_back(share->path);
-        shares.emplace(name, share->path);
+        paths.push_back(share.path);
+        shares.emplace(name, share.path);
     }
     return shares;
 }

@@ -214,12 +214,16 @@ restarts_are() {
     [[ $(restart_count) -eq $1 ]]
 }
 
+monitor_file() { # SHARE
+    grep --files-with-matches --fixed-strings --recursive -- "/$1/@eaDir/" $MONITOR_DIRECTORY 2>/dev/null
+}
+
 monitored() { # FULL_PATH SHARE
     grep --quiet --fixed-strings -- \
         "\"config\":[{\"ignore\":[\"@eaDir\"],\"mask\":65486,\"path\":\"$1\"}]" \
-        $MONITOR_DIRECTORY/*"%2F$2%2F"*.json
+        "$(monitor_file "$2")"
 }
 
 not_monitored() { # SHARE
-    ! compgen -G "$MONITOR_DIRECTORY/*%2F$1%2F*.json" >/dev/null
+    ! monitor_file "$1" >/dev/null
 }

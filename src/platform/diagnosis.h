@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-// What a provider may tell of itself to whoever looks for faults. The library asks none of it, and a
-// provider need not have it: the functions are weak, so one that is missing has a null address.
+// What a provider may tell of itself to whoever looks for faults. The library asks none of it, and
+// a provider need not have it: the functions are weak, so one that is missing has a null address.
 // Nothing is changed, logged or recorded as an error.
 
 #pragma GCC visibility push(default)

@@ -38,12 +38,22 @@ TEST_F(MetadataDirTest, RefusesALinkToADirectory) {
     EXPECT_EQ(kErrNotADirectory, VLIBCErrGet());
 }
 
-TEST_F(MetadataDirTest, MakesNothingBehindALink) {
+// With a slash behind it the link would be followed.
+TEST_F(MetadataDirTest, RefusesADanglingLink) {
+    ASSERT_EQ(0, ::symlink("elsewhere", kDirectory));
+    for (const char *path : {kDirectory, "/volume1/photos/@eaDir/"}) {
+        EXPECT_LT(VANOEAMKDir(0, path), 0);
+        EXPECT_EQ(kErrNotADirectory, VLIBCErrGet());
+        EXPECT_FALSE(Exists("/volume1/photos/elsewhere"));
+    }
+}
+
+// The way to a share is the administrator's.
+TEST_F(MetadataDirTest, FollowsALinkToTheShare) {
     MakeDirs("/volume1/photos/elsewhere");
     ASSERT_EQ(0, ::symlink("elsewhere", "/volume1/photos/share"));
-    EXPECT_LT(VANOEAMKDir(0, "/volume1/photos/share/@eaDir"), 0);
-    EXPECT_EQ(kErrMakeDir, VLIBCErrGet());
-    EXPECT_FALSE(Exists("/volume1/photos/elsewhere/@eaDir"));
+    EXPECT_EQ(0, VANOEAMKDir(0, "/volume1/photos/share/@eaDir"));
+    EXPECT_TRUE(Exists("/volume1/photos/elsewhere/@eaDir"));
 }
 
 TEST_F(MetadataDirTest, TakesAPathAsItIsWritten) {

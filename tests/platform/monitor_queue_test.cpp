@@ -1,12 +1,13 @@
 #include "platform/monitor_queue.h"
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 #include <json/writer.h>
 #include <string>
 #include <sys/stat.h>
 #include <utility>
 #include <vector>
 
+#include "platform/diagnosis.h"
 #include "platform/linux/error_codes.h"
 #include "platform/vano_platform.h"
 #include "support/files.h"
@@ -60,7 +61,7 @@ TEST_F(MonitorQueueTest, UpsertStoresTheWholeDescription) {
     ASSERT_TRUE(Upsert(Description()));
     const auto names = NamesIn(kDirectory);
     ASSERT_EQ(1U, names.size());
-    EXPECT_EQ("fileindex-%2Fvolume1%2Fphotos%2F@eaDir%2FVANO@file_index_queue.json", names[0]);
+    EXPECT_THAT(names[0], ::testing::MatchesRegex("fileindex-[0-9a-f]{16}\\.json"));
     Json::Value expected = Description();
     expected["consumer"] = kConsumer;
     expected["type"] = 1;
@@ -91,13 +92,11 @@ TEST_F(MonitorQueueTest, AnEmptyConfigurationIsStored) {
     EXPECT_TRUE(Stored(NamesIn(kDirectory)[0])["config"].isArray());
 }
 
-// Names that a careless spelling would bring together.
 TEST_F(MonitorQueueTest, EveryConsumerAndQueueHasItsOwnFile) {
     const std::string lengthy(250, 'x');
     const std::vector<std::pair<std::string, std::string>> pairs = {
-        {"a", "b-c"},         {"a-b", "c"},         {"a", "/b"}, {"a", "%2Fb"},
-        {"a", "b/c"},         {"a", "B-c"},         {"a", "~"},  {"a", " "},
-        {"a", lengthy + "1"}, {"a", lengthy + "2"}, {"a/b", "c"}};
+        {"a", "b-c"}, {"a-b", "c"}, {"a", "/b"},          {"a", "b/c"},
+        {"a", "B-c"}, {"a", " "},   {"a", lengthy + "1"}, {"a", lengthy + "2"}};
     for (const auto &[consumer, queue] : pairs) {
         ASSERT_TRUE(Upsert(Description(queue), consumer)) << consumer << " " << queue;
     }
@@ -109,16 +108,15 @@ TEST_F(MonitorQueueTest, EveryConsumerAndQueueHasItsOwnFile) {
     }
 }
 
-// A long queue name's file bears a hash; a queue that is named like that hash has another file.
-TEST_F(MonitorQueueTest, AQueueNamedLikeAHashHasItsOwnFile) {
-    const std::string lengthy = "/volume1/" + std::string(250, 'x');
-    ASSERT_TRUE(Upsert(Description(lengthy)));
-    const std::string name = NamesIn(kDirectory)[0];
-    const std::size_t start = name.find('-') + 1;
-    const std::string hash = name.substr(start, name.rfind('.') - start);
-    ASSERT_TRUE(Upsert(Description(hash)));
-    EXPECT_EQ(2U, NamesIn(kDirectory).size());
-    EXPECT_EQ(lengthy, Stored(name)["queue"].asString());
+TEST_F(MonitorQueueTest, AConsumersNameMustBeginAFileName) {
+    const std::string zero("a\0b", 3);
+    for (const std::string &consumer :
+         {std::string("a/b"), std::string(".a"), std::string(".."), std::string(65, 'x'), zero}) {
+        EXPECT_FALSE(Upsert(Description(), consumer)) << consumer;
+        EXPECT_EQ(kErrBadParameter, VLIBCErrGet()) << consumer;
+        EXPECT_FALSE(Delete(kQueue, consumer)) << consumer;
+    }
+    EXPECT_TRUE(Upsert(Description(), std::string(64, 'x')));
 }
 
 TEST_F(MonitorQueueTest, AFileThatHoldsAnotherQueueIsNeverTouched) {
@@ -196,6 +194,47 @@ TEST_F(MonitorQueueTest, AStoreThatCannotBeWrittenIsAFailure) {
     VLIBCErrSetEx(0, "", 0);
     EXPECT_FALSE(Delete(kQueue));
     EXPECT_EQ(kErrMonitorStore, VLIBCErrGet());
+}
+
+// --- what is told for diagnosis -------------------------------------------------------------
+
+TEST_F(MonitorQueueTest, WatchesAreListed) {
+    EXPECT_TRUE(ListMonitorWatches(kConsumer).watches.empty());
+    EXPECT_TRUE(ListMonitorWatches(kConsumer).faults.empty()) << "without the directory";
+    ASSERT_TRUE(Upsert(Description()));
+    ASSERT_TRUE(Upsert(Description(), "another"));
+    PutFile(std::string(kDirectory) + "/fileindex-notes.txt", "");
+    const auto known = ListMonitorWatches(kConsumer);
+    EXPECT_EQ(kDirectory, known.directory);
+    ASSERT_EQ(1U, known.watches.size());
+    EXPECT_EQ(kQueue, known.watches[0].queue);
+    EXPECT_THAT(known.watches[0].paths, ::testing::ElementsAre("/volume1/photos"));
+    EXPECT_TRUE(Exists(known.watches[0].file));
+    EXPECT_TRUE(known.faults.empty());
+}
+
+TEST_F(MonitorQueueTest, FilesThatDescribeNoQueueAreFaults) {
+    const std::string file = std::string(kDirectory) + "/fileindex-x.json";
+    MakeDirs(kDirectory);
+    for (const char *text : {"{", "[]", R"({"queue":"/q","config":[]})",
+                             R"({"queue":"/q","config":[],"consumer":"other"})",
+                             R"({"queue":1,"config":[],"consumer":"fileindex"})"}) {
+        PutFile(file, text);
+        const auto known = ListMonitorWatches(kConsumer);
+        EXPECT_TRUE(known.watches.empty()) << text;
+        ASSERT_EQ(1U, known.faults.size()) << text;
+        EXPECT_EQ(StoreFault::Kind::kMalformed, known.faults[0].kind) << text;
+        EXPECT_EQ(file, known.faults[0].file) << text;
+    }
+    RemoveTree(file);
+    MakeDirs(file);
+    EXPECT_EQ(StoreFault::Kind::kUnreadable, ListMonitorWatches(kConsumer).faults.at(0).kind);
+    RemoveTree(kDirectory);
+    PutFile(kDirectory, "");
+    const auto known = ListMonitorWatches(kConsumer);
+    ASSERT_EQ(1U, known.faults.size());
+    EXPECT_EQ(StoreFault::Kind::kUnreadable, known.faults[0].kind);
+    EXPECT_EQ(kDirectory, known.faults[0].file);
 }
 
 } // namespace

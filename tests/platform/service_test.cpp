@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "mounts.h"
+#include "platform/diagnosis.h"
 #include "platform/linux/error_codes.h"
 #include "platform/vano_platform.h"
 
@@ -153,6 +154,17 @@ TEST_F(SysvTest, SambaIsWhatTheDistributionCallsIt) {
     }
 }
 
+TEST_F(SysvTest, TheCommandToTypeIsThatOfTheServiceProgram) {
+    EXPECT_EQ("service fileindexd restart", ServiceCommand("restart", "fileindexd"));
+    PutScript("smbd");
+    EXPECT_EQ("service smbd restart", ServiceCommand("restart", "samba"));
+    EXPECT_EQ("", ServiceCommand("restart", "-h"));
+    PutFile("/tmp/empty", "");
+    const Mount cover = Cover("/usr/sbin/service", "/tmp/empty");
+    ASSERT_TRUE(cover);
+    EXPECT_EQ("", ServiceCommand("restart", "fileindexd"));
+}
+
 // --- systemd -------------------------------------------------------------------------------------
 
 class SystemdTest : public ::testing::Test {
@@ -211,6 +223,11 @@ TEST_F(SystemdTest, BothStepsAreTriedWhicheverFails) {
     PutSystemctl("disable");
     EXPECT_LT(VLIBServiceStop("fileindexd", 1), 0);
     EXPECT_EQ(kErrServiceBoot, VLIBCErrGet());
+}
+
+TEST_F(SystemdTest, TheCommandToTypeIsThatOfSystemctl) {
+    EXPECT_EQ("systemctl restart fileindexd", ServiceCommand("restart", "fileindexd"));
+    EXPECT_THAT(Calls(), ElementsAre()) << "it is not run";
 }
 
 TEST_F(SystemdTest, SambaIsTheUnitThatIsInstalled) {

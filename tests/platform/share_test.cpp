@@ -4,7 +4,6 @@
 #include <cstdio>
 #include <cstring>
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <memory>
 #include <optional>
 #include <string>
@@ -13,6 +12,7 @@
 #include <unistd.h>
 #include <vector>
 
+#include "platform/diagnosis.h"
 #include "platform/linux/error_codes.h"
 #include "platform/vano_platform.h"
 #include "support/fault.h"
@@ -59,6 +59,8 @@ std::string Split(const std::string &fullPath, int nameSize = 492, int pathSize 
 const std::string kUnknown = std::to_string(kErrNoSuchShare);
 const std::string kUnusable = std::to_string(kErrShareTable);
 const std::string kOutside = std::to_string(kErrNotInShare);
+
+const std::string kRepeated = "it repeats another share's name or directory";
 
 class ShareTest : public ::testing::Test {
   protected:
@@ -169,32 +171,74 @@ TEST_F(ShareTest, ATableWithoutPermissionIsNoticedWhenItCanBeRead) {
 
 // Every entry is of a table that has one good share besides.
 TEST_F(ShareTest, EntriesThatCannotWorkAreLeftOut) {
-    const std::vector<std::pair<std::string, std::string>> rows = {
-        {"relative", R"("volume1/relative")"},
-        {"other", R"("/volume1/else")"},
-        {"number", "5"},
-        {"null", "null"},
-        {"list", R"(["/volume1/list"])"},
-        {"nopath", R"({"read_only":true})"},
-        {"badpath", R"({"path":1})"},
-        {"flag", R"({"path":"/volume1/flag","encrypted":1})"},
-        {"text", R"({"path":"/volume1/text","read_only":"no"})"},
-        {"up", R"("/volume1/../up")"},
-        {"dot", R"("/volume1/./dot")"},
-        {"..", R"("/volume1/..")"},
-        {"", R"("/volume1/")"},
-        {"a/b", R"("/volume1/a/b")"},
-        {"root", R"("/")"},
-        {"empty", R"("")"},
-        {"zero", R"("/volume1/\u0000/zero")"}};
-    for (const auto &[name, value] : rows) {
-        PutTable("{\"good\":\"/volume1/good\",\"" + name + "\":" + value + "}");
-        EXPECT_EQ("good at /volume1/good", Found("good")) << name;
-        if (!name.empty()) {
-            EXPECT_EQ(kUnknown, Found(name));
+    const std::string notPlain = "its directory is no plain absolute path";
+    const std::string otherName = "its directory does not end in the share's name";
+    const std::string noDirectory = "it names no directory";
+    const std::string badName = "its name can be no directory's";
+    const struct {
+        std::string name;
+        const char *value;
+        std::string reason;
+    } rows[] = {{"relative", R"("volume1/relative")", notPlain},
+                {"other", R"("/volume1/else")", otherName},
+                {"number", "5", noDirectory},
+                {"null", "null", noDirectory},
+                {"list", R"(["/volume1/list"])", noDirectory},
+                {"nopath", R"({"read_only":true})", noDirectory},
+                {"badpath", R"({"path":1})", noDirectory},
+                {"flag", R"({"path":"/volume1/flag","encrypted":1})",
+                 R"(its "encrypted" is neither true nor false)"},
+                {"text", R"({"path":"/volume1/text","read_only":"no"})",
+                 R"(its "read_only" is neither true nor false)"},
+                {"own", R"({"path":"/volume1/own","encryption":null})",
+                 R"(its "encryption" is neither true nor false)"},
+                {"up", R"("/volume1/../up")", notPlain},
+                {"dot", R"("/volume1/./dot")", notPlain},
+                {"..", R"("/volume1/..")", badName},
+                {"", R"("/volume1/")", badName},
+                {"a/b", R"("/volume1/a/b")", badName},
+                {"root", R"("/")", notPlain},
+                {"empty", R"("")", notPlain},
+                {"zero", R"("/volume1/\u0000/zero")", notPlain}};
+    for (const auto &row : rows) {
+        PutTable("{\"good\":\"/volume1/good\",\"" + row.name + "\":" + row.value + "}");
+        EXPECT_EQ("good at /volume1/good", Found("good")) << row.name;
+        if (!row.name.empty()) {
+            EXPECT_EQ(kUnknown, Found(row.name));
         }
-        ExpectLog({"share_table:* share table entry left out, share=" + name});
+        ExpectLog({"share_table:* share table entry left out, share=" + row.name +
+                   ", reason=" + row.reason});
+        const ShareList list = ListShares();
+        EXPECT_THAT(list.names, ::testing::ElementsAre("good"));
+        ASSERT_EQ(1U, list.faults.size());
+        EXPECT_EQ(StoreFault::Kind::kLeftOut, list.faults[0].kind);
+        EXPECT_EQ(row.name, list.faults[0].entry);
+        EXPECT_EQ(row.reason, list.faults[0].reason);
+        ExpectLog({});
     }
+}
+
+TEST_F(ShareTest, ATableOfNoUseIsTheOnlyFault) {
+    using Kind = StoreFault::Kind;
+    const auto expectFault = [](Kind kind, const char *reason) {
+        const ShareList list = ListShares();
+        EXPECT_EQ(kTable, list.file);
+        EXPECT_TRUE(list.names.empty());
+        ASSERT_EQ(1U, list.faults.size());
+        EXPECT_EQ(kind, list.faults[0].kind);
+        EXPECT_EQ(kTable, list.faults[0].file);
+        EXPECT_EQ(reason, list.faults[0].reason);
+    };
+    expectFault(Kind::kMissing, "No such file or directory");
+    PutTable("[]");
+    expectFault(Kind::kMalformed, "it is no JSON object");
+    Fault::FailAlways(Call::Open, EACCES);
+    expectFault(Kind::kUnreadable, "Permission denied");
+    Fault::Reset();
+    PutTable(R"({"photos":"/volume1/photos","Music":"/volume1/Music"})");
+    EXPECT_THAT(ListShares().names, ::testing::ElementsAre("Music", "photos"));
+    EXPECT_TRUE(ListShares().faults.empty());
+    ExpectLog({});
 }
 
 TEST_F(ShareTest, ARepeatedNameOrDirectoryIsLeftOut) {
@@ -203,8 +247,8 @@ TEST_F(ShareTest, ARepeatedNameOrDirectoryIsLeftOut) {
     EXPECT_EQ("Photos at /volume1/Photos", Found("photos"));
     EXPECT_EQ("MUSIC at /volume1/MUSIC", Found("music"));
     EXPECT_EQ(kOutside, Split("/volume2/photos"));
-    ExpectLog({"share_table:* share table entry repeats another, share=music",
-               "share_table:* share table entry repeats another, share=photos"});
+    ExpectLog({"share_table:* share table entry left out, share=music, reason=" + kRepeated,
+               "share_table:* share table entry left out, share=photos, reason=" + kRepeated});
 }
 
 TEST_F(ShareTest, AChangedTableIsNoticedAtTheNextCall) {

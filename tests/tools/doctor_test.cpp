@@ -763,8 +763,9 @@ TEST_F(DoctorTest, ALinkInThePlaceOfTheQueuesDirectoryIsNotFollowed) {
 
 std::string MonitorFileOf(const std::string &share) {
     for (const std::string &name : NamesIn(kMonitors)) {
-        if (name.find(share) != std::string::npos) {
-            return std::string(kMonitors) + "/" + name;
+        const std::string file = std::string(kMonitors) + "/" + name;
+        if (ReadText(file).find("/" + share + "/@eaDir/") != std::string::npos) {
+            return file;
         }
     }
     ADD_FAILURE() << "no configuration of " << share;

@@ -16,7 +16,7 @@ namespace VANO::PLATFORM {
 // Runs the body of a boundary function. Its callers may be C: an exception (there is no memory)
 // becomes a recorded failure and the result `failed`.
 template <typename Result, typename Body>
-Result NoThrow(Result failed, Body &&body) noexcept {
+Result Guarded(Result failed, Body &&body) noexcept {
     try {
         return std::forward<Body>(body)();
     } catch (const std::exception &) {

@@ -10,7 +10,7 @@
 #include "error.h"
 #include "fs_type.h"
 #include "mount_source.h"
-#include "paths.h"
+#include "places.h"
 
 namespace {
 
@@ -80,7 +80,7 @@ int VANOGetFSType(const char *path, int /*flags*/) {
         (void)PLATFORM_FAIL(kErrBadParameter);
         return kFsUnknown;
     }
-    return NoThrow<int>(kFsUnknown, [&] { return FsTypeOf(path); });
+    return Guarded<int>(kFsUnknown, [&] { return FsTypeOf(path); });
 }
 
 // A symbolic link to a mount point is none. What is bound from elsewhere in the same file system is

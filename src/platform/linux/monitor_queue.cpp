@@ -1,16 +1,20 @@
 #include "monitor_queue.h"
 
+#include <algorithm>
 #include <cerrno>
-#include <climits>
 #include <cstdint>
 #include <cstdio>
+#include <cstring>
+#include <filesystem>
 #include <string_view>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "base/file_io.h"
 #include "base/json_io.h"
+#include "diagnosis.h"
 #include "error.h"
-#include "paths.h"
+#include "places.h"
 
 namespace VANO::VANOTIFYD {
 
@@ -19,27 +23,8 @@ namespace {
 using namespace PLATFORM;
 
 constexpr mode_t kStoreMode = 0755;
-constexpr std::string_view kSuffix = ".json";
-// What the temporary file beside a description adds to its name.
-constexpr std::size_t kTemporarySuffix = sizeof(".XXXXXX") - 1;
-constexpr std::size_t kMaxName = NAME_MAX - kTemporarySuffix;
-
-// A part of a file name: "/", "%", "~", "-" and control characters as "%XX", all else as it is.
-std::string Escape(std::string_view text) {
-    std::string escaped;
-    for (const char c : text) {
-        const auto byte = static_cast<unsigned char>(c);
-        if (byte > ' ' && byte != 0x7F &&
-            std::string_view("/%~-").find(c) == std::string_view::npos) {
-            escaped.push_back(c);
-            continue;
-        }
-        char code[sizeof "%XX"];
-        (void)std::snprintf(code, sizeof code, "%%%02X", byte);
-        escaped.append(code);
-    }
-    return escaped;
-}
+constexpr char kSuffix[] = ".json";
+constexpr std::size_t kMaxConsumer = 64;
 
 // FNV-1a.
 std::uint64_t Hash(std::string_view text) {
@@ -50,24 +35,22 @@ std::uint64_t Hash(std::string_view text) {
     return hash;
 }
 
-// The file of one consumer and queue: "<consumer>-<queue>.json", both escaped, which no other pair
-// has. Where that is too long for a file name, the queue's hash takes its place behind a "~"; the
-// file's content then tells whether it is this queue's.
+// The file of one consumer and queue. Its content tells whether it is that queue's.
 std::string FileOf(const std::string &consumer, const std::string &queue) {
-    const std::string prefix = Escape(consumer) + "-";
-    std::string name = prefix + Escape(queue);
-    if (name.size() + kSuffix.size() > kMaxName) {
-        char hash[sizeof "~0123456789ABCDEF"];
-        (void)std::snprintf(hash, sizeof hash, "~%016llX",
-                            static_cast<unsigned long long>(Hash(queue)));
-        name = prefix + hash;
-    }
-    return std::string(kMonitorDirectory) + "/" + name.append(kSuffix);
+    char hash[sizeof "0123456789abcdef"];
+    (void)std::snprintf(hash, sizeof hash, "%016llx", static_cast<unsigned long long>(Hash(queue)));
+    return std::string(kMonitorDirectory) + "/" + consumer + "-" + hash + kSuffix;
+}
+
+// A consumer's name begins file names.
+bool IsConsumer(const std::string &name) {
+    return !name.empty() && name.size() <= kMaxConsumer && name[0] != '.' &&
+           name.find('/') == std::string::npos && name.find('\0') == std::string::npos;
 }
 
 bool IsRequest(const std::string &queue, const std::string &consumer,
                _tag_monitor_queue_type_ type) {
-    return !queue.empty() && !consumer.empty() && type == MONITOR_QUEUE_TYPE_FILE;
+    return !queue.empty() && IsConsumer(consumer) && type == MONITOR_QUEUE_TYPE_FILE;
 }
 
 // Whether the file holds another queue's description; a file that is missing or of no use does not.
@@ -128,6 +111,36 @@ bool Remove(const std::string &queue, const std::string &consumer, _tag_monitor_
     return false;
 }
 
+// Whether a file's name is one that FileOf() gives for the consumer.
+bool IsFileOf(const std::string &consumer, const std::string &name) {
+    const std::string begin = consumer + "-";
+    const std::string_view suffix = kSuffix;
+    return name.size() > begin.size() + suffix.size() &&
+           name.compare(0, begin.size(), begin) == 0 &&
+           name.compare(name.size() - suffix.size(), suffix.size(), suffix) == 0;
+}
+
+void AddWatch(MonitorWatches &known, const std::string &file, const std::string &consumer) {
+    std::string text;
+    Json::Value stored;
+    if (!FILEINDEX::ReadFile(text, file, FILEINDEX::kMaxJsonFileBytes)) {
+        known.faults.push_back({StoreFault::Kind::kUnreadable, file, {}, std::strerror(errno)});
+        return;
+    }
+    if (!FILEINDEX::JsonFromString(stored, text) || !IsDescription(stored) ||
+        stored["consumer"] != consumer) {
+        known.faults.push_back({StoreFault::Kind::kMalformed, file, {}, "it describes no queue"});
+        return;
+    }
+    MonitorWatch watch{file, stored["queue"].asString(), {}};
+    for (const Json::Value &entry : stored["config"]) {
+        if (entry.isObject() && entry["path"].isString()) {
+            watch.paths.push_back(entry["path"].asString());
+        }
+    }
+    known.watches.push_back(std::move(watch));
+}
+
 } // namespace
 
 MonitorQueue::MonitorQueue(const Json::Value &queueDescription) : description(queueDescription) {}
@@ -136,12 +149,37 @@ MonitorQueue::~MonitorQueue() = default;
 
 bool MonitorQueue::Upsert(const MonitorQueue &queue, const std::string &consumer,
                           _tag_monitor_queue_type_ type) {
-    return NoThrow(false, [&] { return Store(queue.description, consumer, type); });
+    return Guarded(false, [&] { return Store(queue.description, consumer, type); });
 }
 
 bool MonitorQueue::Delete(const std::string &queue, const std::string &consumer,
                           _tag_monitor_queue_type_ type) {
-    return NoThrow(false, [&] { return Remove(queue, consumer, type); });
+    return Guarded(false, [&] { return Remove(queue, consumer, type); });
 }
 
 } // namespace VANO::VANOTIFYD
+
+namespace VANO::PLATFORM {
+
+MonitorWatches ListMonitorWatches(const std::string &consumer) {
+    MonitorWatches known{kMonitorDirectory, {}, {}};
+    std::error_code error;
+    std::vector<std::string> names;
+    for (auto entry = std::filesystem::directory_iterator(kMonitorDirectory, error);
+         !error && entry != std::filesystem::directory_iterator(); entry.increment(error)) {
+        names.push_back(entry->path().filename());
+    }
+    if (error && error != std::errc::no_such_file_or_directory) {
+        known.faults.push_back(
+            {StoreFault::Kind::kUnreadable, kMonitorDirectory, {}, error.message()});
+    }
+    std::sort(names.begin(), names.end());
+    for (const std::string &name : names) {
+        if (VANOTIFYD::IsFileOf(consumer, name)) {
+            VANOTIFYD::AddWatch(known, known.directory + "/" + name, consumer);
+        }
+    }
+    return known;
+}
+
+} // namespace VANO::PLATFORM

@@ -7,7 +7,7 @@
 #include <sys/stat.h>
 
 #include "base/file_io.h"
-#include "paths.h"
+#include "places.h"
 
 namespace VANO::PLATFORM {
 

@@ -14,7 +14,7 @@
 
 #include "base/unique_fd.h"
 #include "error.h"
-#include "paths.h"
+#include "places.h"
 
 namespace VANO::PLATFORM {
 
@@ -272,7 +272,7 @@ int VLIBCExecv(const char *path, const char *const *argv, int wait) {
     if (path == nullptr || *path == '\0' || argv == nullptr || argv[0] == nullptr) {
         return PLATFORM_FAIL(kErrBadParameter);
     }
-    return NoThrow(-1, [&] { return RecordResult(Run(path, argv, wait != 0)); });
+    return Guarded(-1, [&] { return RecordResult(Run(path, argv, wait != 0)); });
 }
 
 int VLIBCExec(const char *path, ...) {
@@ -281,7 +281,7 @@ int VLIBCExec(const char *path, ...) {
     }
     va_list arguments;
     va_start(arguments, path);
-    const int result = NoThrow(-1, [&] {
+    const int result = Guarded(-1, [&] {
         std::vector<const char *> argv{path};
         do {
             // NOLINTNEXTLINE(clang-analyzer-valist.Uninitialized): started before the lambda

@@ -85,7 +85,7 @@ int VANOQuotaIsEnough(int /*reserved*/, const char *dir, long long bytes) {
         (void)PLATFORM_FAIL(kErrBadParameter);
         return 0;
     }
-    return NoThrow(0, [&] {
+    return Guarded(0, [&] {
         const UniqueFd directory(::open(dir, O_PATH | O_DIRECTORY | O_CLOEXEC));
         if (!directory) {
             (void)PLATFORM_FAIL(kErrRoomCheck);

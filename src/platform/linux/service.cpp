@@ -3,8 +3,9 @@
 #include <string_view>
 #include <sys/stat.h>
 
+#include "diagnosis.h"
 #include "error.h"
-#include "paths.h"
+#include "places.h"
 #include "program.h"
 
 namespace {
@@ -105,7 +106,7 @@ int WithService(const char *name, Operation &&operation) {
     if (!IsServiceName(name)) {
         return PLATFORM_FAIL(kErrBadParameter);
     }
-    return NoThrow(-1, [&] {
+    return Guarded(-1, [&] {
         const ServiceControl service(name);
         ErrorCode code = service.Check();
         if (code == kErrNone) {
@@ -145,3 +146,16 @@ int VLIBServiceRestart(const char *name) {
         return service.Do("restart") ? kErrNone : kErrServiceAction;
     });
 }
+
+namespace VANO::PLATFORM {
+
+std::string ServiceCommand(const std::string &action, const std::string &service) {
+    const bool systemd = IsSystemdRunning();
+    if (!IsServiceName(service.c_str()) || !IsProgram(systemd ? kSystemctl : kService)) {
+        return {};
+    }
+    const std::string name = DistributionName(service.c_str(), systemd);
+    return systemd ? "systemctl " + action + " " + name : "service " + name + " " + action;
+}
+
+} // namespace VANO::PLATFORM

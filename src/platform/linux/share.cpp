@@ -3,6 +3,7 @@
 #include <string_view>
 
 #include "error.h"
+#include "places.h"
 #include "share_table.h"
 
 namespace {
@@ -13,15 +14,15 @@ constexpr std::string_view kRecycleBin = "#recycle";
 constexpr std::string_view kSnapshots = "#snapshot";
 
 // What VANOShareGet() hands out: the strings that the C record points to, and the properties.
-struct ShareRecord : _tag_VANOSHARE {
-    explicit ShareRecord(const Share &from) : _tag_VANOSHARE(), share(from) {
+struct HandedOutShare : _tag_VANOSHARE {
+    explicit HandedOutShare(const TableShare &from) : _tag_VANOSHARE(), share(from) {
         name = share.name.data();
         path = share.path.data();
     }
-    ShareRecord(const ShareRecord &) = delete;
-    ShareRecord &operator=(const ShareRecord &) = delete;
+    HandedOutShare(const HandedOutShare &) = delete;
+    HandedOutShare &operator=(const HandedOutShare &) = delete;
 
-    Share share;
+    TableShare share;
 };
 
 bool IsEmpty(const char *text) {
@@ -37,18 +38,18 @@ bool CopyOut(char *buffer, int size, std::string_view text) {
     return true;
 }
 
-int GetFlag(const _tag_VANOSHARE *share, int *flag, bool Share::*property) {
+int GetFlag(const _tag_VANOSHARE *share, int *flag, bool TableShare::*property) {
     if (share == nullptr || flag == nullptr) {
         return PLATFORM_FAIL(kErrBadParameter);
     }
-    *flag = static_cast<const ShareRecord *>(share)->share.*property ? 1 : 0;
+    *flag = static_cast<const HandedOutShare *>(share)->share.*property ? 1 : 0;
     return 0;
 }
 
 // Whether the path is, or lies beneath, the directory of that name at its share's top.
 bool IsBelowShareTop(const char *fullPath, std::string_view topName) {
     const auto table = CurrentShareTable();
-    const Share *share = table->FindByFullPath(fullPath);
+    const TableShare *share = table->FindByFullPath(fullPath);
     if (share == nullptr) {
         return false;
     }
@@ -66,19 +67,19 @@ int VANOShareGet(const char *name, struct _tag_VANOSHARE **share) {
     if (share == nullptr || IsEmpty(name)) {
         return PLATFORM_FAIL(kErrBadParameter);
     }
-    return NoThrow(-1, [&] {
+    return Guarded(-1, [&] {
         const auto table = CurrentShareTable();
-        const Share *found = table->FindByName(name);
+        const TableShare *found = table->FindByName(name);
         if (found == nullptr) {
             return PLATFORM_FAIL(table->IsUsable() ? kErrNoSuchShare : kErrShareTable);
         }
-        *share = std::make_unique<ShareRecord>(*found).release();
+        *share = std::make_unique<HandedOutShare>(*found).release();
         return 0;
     });
 }
 
 void VANOShareFree(struct _tag_VANOSHARE *share) {
-    const std::unique_ptr<ShareRecord> owner(static_cast<ShareRecord *>(share));
+    const std::unique_ptr<HandedOutShare> owner(static_cast<HandedOutShare *>(share));
 }
 
 // The second buffer gets what follows the share's directory, byte for byte: empty for the share
@@ -88,9 +89,9 @@ int VANOShareNamePathGet(const char *fullPath, char *name, int nameSize, char *p
     if (IsEmpty(fullPath) || name == nullptr || path == nullptr || nameSize <= 0 || pathSize <= 0) {
         return PLATFORM_FAIL(kErrBadParameter);
     }
-    return NoThrow(-1, [&] {
+    return Guarded(-1, [&] {
         const auto table = CurrentShareTable();
-        const Share *share = table->FindByFullPath(fullPath);
+        const TableShare *share = table->FindByFullPath(fullPath);
         if (share == nullptr) {
             return PLATFORM_FAIL(table->IsUsable() ? kErrNotInShare : kErrShareTable);
         }
@@ -105,15 +106,15 @@ int VANOShareNamePathGet(const char *fullPath, char *name, int nameSize, char *p
 }
 
 int VLIBShareIsEncryptedGet(struct _tag_VANOSHARE *share, int *flag) {
-    return GetFlag(share, flag, &Share::encrypted);
+    return GetFlag(share, flag, &TableShare::encrypted);
 }
 
 int VLIBShareIsReadOnlyGet(struct _tag_VANOSHARE *share, int *flag) {
-    return GetFlag(share, flag, &Share::readOnly);
+    return GetFlag(share, flag, &TableShare::readOnly);
 }
 
 int VLIBShareIsEncryptionGet(struct _tag_VANOSHARE *share, int *flag) {
-    return GetFlag(share, flag, &Share::encryption);
+    return GetFlag(share, flag, &TableShare::encryption);
 }
 
 int VANOShareIsShareRecycle(const char *fullPath) {
@@ -121,15 +122,28 @@ int VANOShareIsShareRecycle(const char *fullPath) {
         (void)PLATFORM_FAIL(kErrBadParameter);
         return 0;
     }
-    return NoThrow(0, [&] { return IsBelowShareTop(fullPath, kRecycleBin) ? 1 : 0; });
+    return Guarded(0, [&] { return IsBelowShareTop(fullPath, kRecycleBin) ? 1 : 0; });
 }
 
 int VLIBFhsPathInSnapshot(const char *fullPath, int *flag) {
     if (fullPath == nullptr || flag == nullptr) {
         return PLATFORM_FAIL(kErrBadParameter);
     }
-    return NoThrow(-1, [&] {
+    return Guarded(-1, [&] {
         *flag = IsBelowShareTop(fullPath, kSnapshots) ? 1 : 0;
         return 0;
     });
 }
+
+namespace VANO::PLATFORM {
+
+ShareList ListShares() {
+    const ShareTable table = ShareTable::Load();
+    ShareList list{kShareTablePath, {}, table.Faults()};
+    for (const TableShare &share : table.Shares()) {
+        list.names.push_back(share.name);
+    }
+    return list;
+}
+
+} // namespace VANO::PLATFORM

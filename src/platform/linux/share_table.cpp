@@ -11,7 +11,7 @@
 #include "base/json_io.h"
 #include "base/log.h"
 #include "case_fold.h"
-#include "paths.h"
+#include "places.h"
 
 namespace VANO::PLATFORM {
 
@@ -49,15 +49,15 @@ std::string NormalDirectory(std::string_view path) {
     return normal;
 }
 
-bool ReadFlag(bool &flag, const Json::Value &entry, const char *key) {
+const char *ReadFlag(bool &flag, const Json::Value &entry, const char *key, const char *mistake) {
     if (!entry.isMember(key)) {
-        return true;
+        return nullptr;
     }
     if (!entry[key].isBool()) {
-        return false;
+        return mistake;
     }
     flag = entry[key].asBool();
-    return true;
+    return nullptr;
 }
 
 // What tells one state of the file from another.
@@ -97,96 +97,119 @@ struct FileState {
     }
 };
 
+void LogFault(const StoreFault &fault) {
+    switch (fault.kind) {
+    case StoreFault::Kind::kLeftOut:
+        LogError(kUnit, __LINE__, "share table entry left out, share=%s, reason=%s",
+                 fault.entry.c_str(), fault.reason.c_str());
+        break;
+    case StoreFault::Kind::kMalformed:
+        LogError(kUnit, __LINE__, "share table is not a JSON object, path=%s", fault.file.c_str());
+        break;
+    default:
+        LogError(kUnit, __LINE__, "share table cannot be read, path=%s, reason=%s",
+                 fault.file.c_str(), fault.reason.c_str());
+        break;
+    }
+}
+
 class ShareTableCache {
   public:
     std::shared_ptr<const ShareTable> Get() {
         const std::lock_guard<std::mutex> lock(mutex_);
         // Taken before the file is read: a change in between is then seen at the next call.
         const FileState now = FileState::Of(kShareTablePath);
-        if (table_ == nullptr || retry_ || !(now == state_)) {
-            const bool isNews = !(now == state_);
-            table_ = Load(!isNews);
+        const bool isNews = !(now == state_);
+        if (isNews || table_ == nullptr || !IsLasting(*table_)) {
+            table_ = std::make_shared<const ShareTable>(ShareTable::Load());
             state_ = now;
+            if (isNews) {
+                std::for_each(table_->Faults().begin(), table_->Faults().end(), LogFault);
+            }
         }
         return table_;
     }
 
   private:
-    std::shared_ptr<const ShareTable> Load(bool quiet) {
-        // Why a file that is there could not be loaded may be gone at the next call, be it for want
-        // of memory or of a descriptor: only a missing table is remembered.
-        retry_ = true;
-        std::string text;
-        if (!FILEINDEX::ReadFile(text, kShareTablePath, FILEINDEX::kMaxJsonFileBytes)) {
-            retry_ = errno != ENOENT;
-            if (!quiet) {
-                LogError(kUnit, __LINE__, "share table cannot be read, path=%s, reason=%s",
-                         kShareTablePath, std::strerror(errno));
-            }
-            return std::make_shared<const ShareTable>();
-        }
-        Json::Value table;
-        if (!FILEINDEX::JsonFromString(table, text) || !table.isObject()) {
-            if (!quiet) {
-                LogError(kUnit, __LINE__, "share table is not a JSON object, path=%s",
-                         kShareTablePath);
-            }
-            return std::make_shared<const ShareTable>();
-        }
-        auto loaded = std::make_shared<const ShareTable>(table, quiet);
-        retry_ = false;
-        return loaded;
+    // Why a file that is there could not be loaded may be gone at the next call, be it for want of
+    // memory or of a descriptor: only a missing table is remembered.
+    static bool IsLasting(const ShareTable &table) {
+        return table.IsUsable() || table.Faults().front().kind == StoreFault::Kind::kMissing;
     }
 
     std::mutex mutex_;
     FileState state_;
-    bool retry_ = false;
     std::shared_ptr<const ShareTable> table_;
 };
 
 } // namespace
 
-std::optional<Share> ShareFromEntry(const std::string &name, const Json::Value &value) {
-    Share share;
-    share.name = name;
+const char *ReadTableEntry(TableShare &share, const std::string &name, const Json::Value &value) {
     const Json::Value &path = value.isObject() ? value["path"] : value;
-    if (!IsShareName(name) || !path.isString()) {
-        return std::nullopt;
+    if (!IsShareName(name)) {
+        return "its name can be no directory's";
     }
+    if (!path.isString()) {
+        return "it names no directory";
+    }
+    share.name = name;
     share.path = NormalDirectory(path.asString());
-    const std::size_t slash = share.path.rfind('/');
-    if (slash == std::string::npos ||
-        CaseFoldKey(std::string_view(share.path).substr(slash + 1)) != CaseFoldKey(name)) {
-        return std::nullopt;
+    if (share.path.empty()) {
+        return "its directory is no plain absolute path";
     }
-    if (value.isObject() && !(ReadFlag(share.encrypted, value, "encrypted") &&
-                              ReadFlag(share.readOnly, value, "read_only") &&
-                              ReadFlag(share.encryption, value, "encryption"))) {
-        return std::nullopt;
+    const std::string_view last = std::string_view(share.path).substr(share.path.rfind('/') + 1);
+    if (CaseFoldKey(last) != CaseFoldKey(name)) {
+        return "its directory does not end in the share's name";
     }
-    return share;
+    const char *mistake = nullptr;
+    if (value.isObject()) {
+        mistake = ReadFlag(share.encrypted, value, "encrypted",
+                           "its \"encrypted\" is neither true nor false");
+        mistake = mistake != nullptr ? mistake
+                                     : ReadFlag(share.readOnly, value, "read_only",
+                                                "its \"read_only\" is neither true nor false");
+        mistake = mistake != nullptr ? mistake
+                                     : ReadFlag(share.encryption, value, "encryption",
+                                                "its \"encryption\" is neither true nor false");
+    }
+    return mistake;
 }
 
-ShareTable::ShareTable(const Json::Value &table, bool quiet) : usable_(true) {
-    shares_.reserve(table.size());
-    for (auto entry = table.begin(); entry != table.end(); ++entry) {
-        const std::string name = entry.name();
-        std::optional<Share> share = ShareFromEntry(name, *entry);
-        if (share) {
-            Add(std::move(*share), quiet);
-        } else if (!quiet) {
-            LogError(kUnit, __LINE__, "share table entry left out, share=%s", name.c_str());
-        }
+ShareTable ShareTable::Load() {
+    ShareTable table;
+    std::string text;
+    if (!FILEINDEX::ReadFile(text, kShareTablePath, FILEINDEX::kMaxJsonFileBytes)) {
+        table.AddFault(errno == ENOENT ? StoreFault::Kind::kMissing : StoreFault::Kind::kUnreadable,
+                       std::strerror(errno));
+        return table;
     }
+    Json::Value root;
+    if (!FILEINDEX::JsonFromString(root, text) || !root.isObject()) {
+        table.AddFault(StoreFault::Kind::kMalformed, "it is no JSON object");
+        return table;
+    }
+    table.usable_ = true;
+    table.shares_.reserve(root.size());
+    for (auto entry = root.begin(); entry != root.end(); ++entry) {
+        table.AddEntry(entry.name(), *entry);
+    }
+    return table;
 }
 
-void ShareTable::Add(Share share, bool quiet) {
+void ShareTable::AddFault(StoreFault::Kind kind, std::string reason, std::string entry) {
+    faults_.push_back({kind, kShareTablePath, std::move(entry), std::move(reason)});
+}
+
+void ShareTable::AddEntry(const std::string &name, const Json::Value &value) {
+    TableShare share;
+    const char *const mistake = ReadTableEntry(share, name, value);
+    if (mistake != nullptr) {
+        AddFault(StoreFault::Kind::kLeftOut, mistake, name);
+        return;
+    }
     std::u32string key = CaseFoldKey(share.name);
     if (byName_.count(key) != 0 || byPath_.count(share.path) != 0) {
-        if (!quiet) {
-            LogError(kUnit, __LINE__, "share table entry repeats another, share=%s",
-                     share.name.c_str());
-        }
+        AddFault(StoreFault::Kind::kLeftOut, "it repeats another share's name or directory", name);
         return;
     }
     byName_.emplace(std::move(key), shares_.size());
@@ -195,12 +218,12 @@ void ShareTable::Add(Share share, bool quiet) {
     shares_.push_back(std::move(share));
 }
 
-const Share *ShareTable::FindByName(std::string_view name) const {
+const TableShare *ShareTable::FindByName(std::string_view name) const {
     const auto found = byName_.find(CaseFoldKey(name));
     return found == byName_.end() ? nullptr : &shares_[found->second];
 }
 
-const Share *ShareTable::FindByFullPath(std::string_view fullPath) const {
+const TableShare *ShareTable::FindByFullPath(std::string_view fullPath) const {
     std::string directory(fullPath);
     while (!directory.empty()) {
         if (directory.size() <= longestPath_) {

@@ -4,11 +4,12 @@
 #include <cstddef>
 #include <json/value.h>
 #include <memory>
-#include <optional>
 #include <string>
 #include <string_view>
 #include <unordered_map>
 #include <vector>
+
+#include "diagnosis.h"
 
 namespace VANO::PLATFORM {
 
@@ -35,7 +36,7 @@ namespace VANO::PLATFORM {
 // byte order of names, is left out with one line in the log. A table that is missing, unreadable or
 // not a JSON object holds no shares; that is one line in the log too, once for each state of the
 // file.
-struct Share {
+struct TableShare {
     std::string name;
     std::string path;
     bool encrypted = false;
@@ -46,25 +47,31 @@ struct Share {
 // One state of the table; never changes.
 class ShareTable {
   public:
-    ShareTable() = default;
-    // With `quiet` nothing is written to the log.
-    ShareTable(const Json::Value &table, bool quiet);
+    // The table as the file holds it. Throws std::bad_alloc only.
+    [[nodiscard]] static ShareTable Load();
 
     // False for a table that could not be read.
     [[nodiscard]] bool IsUsable() const { return usable_; }
 
+    // What is wrong with it. Where the whole table is of no use that is the only fault.
+    [[nodiscard]] const std::vector<StoreFault> &Faults() const { return faults_; }
+
+    [[nodiscard]] const std::vector<TableShare> &Shares() const { return shares_; }
+
     // Null when there is no such share.
-    [[nodiscard]] const Share *FindByName(std::string_view name) const;
+    [[nodiscard]] const TableShare *FindByName(std::string_view name) const;
 
     // The share with the longest directory that is the full path or holds it by whole components.
     // The path is taken as it is written: ".." is a name. Null when it lies in no share.
-    [[nodiscard]] const Share *FindByFullPath(std::string_view fullPath) const;
+    [[nodiscard]] const TableShare *FindByFullPath(std::string_view fullPath) const;
 
   private:
-    void Add(Share share, bool quiet);
+    void AddFault(StoreFault::Kind kind, std::string reason, std::string entry = {});
+    void AddEntry(const std::string &name, const Json::Value &value);
 
     bool usable_ = false;
-    std::vector<Share> shares_;
+    std::vector<StoreFault> faults_;
+    std::vector<TableShare> shares_;
     std::unordered_map<std::u32string, std::size_t> byName_; // by case-folded name
     std::unordered_map<std::string, std::size_t> byPath_;
     std::size_t longestPath_ = 0;
@@ -74,8 +81,10 @@ class ShareTable {
 // is read once, while other threads wait for it. Throws std::bad_alloc only.
 std::shared_ptr<const ShareTable> CurrentShareTable();
 
-// The entry `name`: `value` of the table; none when it breaks the table's rules.
-std::optional<Share> ShareFromEntry(const std::string &name, const Json::Value &value);
+// Reads the entry `name`: `value` of the table. The rule that it breaks, as a clause; null, with
+// `share` filled, when it keeps them all.
+[[nodiscard]] const char *ReadTableEntry(TableShare &share, const std::string &name,
+                                         const Json::Value &value);
 
 } // namespace VANO::PLATFORM
 

@@ -3,7 +3,7 @@
 #include <strings.h>
 
 #include "error.h"
-#include "paths.h"
+#include "places.h"
 #include "program.h"
 
 namespace {
@@ -51,7 +51,7 @@ int SetSpotlight(bool enable) {
 
 // 1 or 0. What cannot be asked is off, with the reason recorded.
 int VANOSMBIsEnableSpotlight(void) {
-    return NoThrow(0, [] {
+    return Guarded(0, [] {
         const std::optional<bool> spotlight = EffectiveSpotlight();
         if (!spotlight) {
             (void)PLATFORM_FAIL(kErrNoSamba);
@@ -61,5 +61,5 @@ int VANOSMBIsEnableSpotlight(void) {
 }
 
 int VANOSMBSetSpotlight(bool enable) {
-    return NoThrow(-1, [&] { return SetSpotlight(enable); });
+    return Guarded(-1, [&] { return SetSpotlight(enable); });
 }

@@ -1,5 +1,5 @@
-#ifndef VANO_PLATFORM_PATHS_H
-#define VANO_PLATFORM_PATHS_H
+#ifndef VANO_PLATFORM_PLACES_H
+#define VANO_PLATFORM_PLACES_H
 
 // Every fixed place that this library reads, writes or runs.
 
