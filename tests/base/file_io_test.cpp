@@ -17,8 +17,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 using ::testing::MatchesRegex;
 
 constexpr char kDirectory[] = "/volume1/d";
@@ -95,11 +93,7 @@ TEST_F(FileIoTest, OnlyRegularFilesAreRead) {
 }
 
 TEST_F(FileIoTest, ASocketIsNotRead) {
-    const int fd = ::socket(AF_UNIX, SOCK_STREAM, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::strcpy(address.sun_path, kFile);
-    ASSERT_EQ(::bind(fd, reinterpret_cast<sockaddr *>(&address), sizeof(address)), 0);
+    const int fd = ListenAt(kFile);
     std::string read;
     EXPECT_FALSE(ReadFile(read, kFile, kNoLimit));
     ::close(fd);
@@ -361,7 +355,8 @@ TEST_F(FileIoTest, OnceRenamedTheNewTextStandsWhetherTheDirectoryCanBeFlushedOrN
 }
 
 TEST_F(FileIoTest, AFullDiskLeavesTheOldFile) {
-    const TinyVolume volume("/volume2/tiny", 64 * 1024);
+    const Mount volume = TinyVolume("/volume2/tiny", 64 * 1024);
+    ASSERT_TRUE(volume);
     const std::string path = "/volume2/tiny/file";
     PutFile(path, "old");
     EXPECT_FALSE(WriteFile(path, std::string(100 * 1024, 'x')));
@@ -415,7 +410,8 @@ TEST_F(FileIoTest, AMountedFileIsRewritten) {
     PutFile("/volume2/source", "old and longer");
     PutFile(kFile, "hidden");
     {
-        const BindMount mount("/volume2/source", kFile);
+        const Mount mount = Cover(kFile, "/volume2/source");
+        ASSERT_TRUE(mount);
         EXPECT_TRUE(WriteFile(kFile, "new"));
         EXPECT_EQ(ReadText(kFile), "new");
     }
@@ -425,10 +421,12 @@ TEST_F(FileIoTest, AMountedFileIsRewritten) {
 }
 
 TEST_F(FileIoTest, AFullDiskLeavesAMountedFileToo) {
-    const TinyVolume volume("/volume2/tiny", 64 * 1024);
+    const Mount volume = TinyVolume("/volume2/tiny", 64 * 1024);
+    ASSERT_TRUE(volume);
     PutFile("/volume2/tiny/source", "old");
     PutFile(kFile, "hidden");
-    const BindMount mount("/volume2/tiny/source", kFile);
+    const Mount mount = Cover(kFile, "/volume2/tiny/source");
+    ASSERT_TRUE(mount);
     EXPECT_FALSE(WriteFile(kFile, std::string(100 * 1024, 'x')));
     EXPECT_EQ(errno, ENOSPC);
     EXPECT_EQ(ReadText(kFile), "old");

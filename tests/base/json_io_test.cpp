@@ -235,7 +235,8 @@ TEST_F(JsonIoTest, WhatCouldNotBeReadBackIsNotWritten) {
 }
 
 TEST_F(JsonIoTest, AFullDiskLeavesTheOldFile) {
-    const TinyVolume volume("/volume2/tiny", 32 * 1024);
+    const Mount volume = TinyVolume("/volume2/tiny", 32 * 1024);
+    ASSERT_TRUE(volume);
     PutFile("/volume2/tiny/file", "{}");
     EXPECT_FALSE(JsonToFile(Json::Value(std::string(64 * 1024, 'x')), "/volume2/tiny/file"));
     EXPECT_EQ(ReadText("/volume2/tiny/file"), "{}");

@@ -15,8 +15,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-
 const int g_logLevelAtStart = LOG_LEVEL;
 
 constexpr char kFile[] = "/volume1/settings.conf";
@@ -277,7 +275,8 @@ TEST_F(ConfigTest, AModeThatCannotBeSetIsLoggedAndTheFileCountsAsSaved) {
 }
 
 TEST_F(ConfigTest, AFailedSaveKeepsTheDocumentAndTheOldFile) {
-    const TinyVolume volume("/volume2/tiny", 32 * 1024);
+    const Mount volume = TinyVolume("/volume2/tiny", 32 * 1024);
+    ASSERT_TRUE(volume);
     const std::string path = "/volume2/tiny/settings.conf";
     PutFile(path, R"({"old":1})");
     Settings settings(path);

@@ -18,9 +18,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 constexpr char kQueue[] = "/volume1/queue";
 constexpr std::size_t kBuffer = std::size_t{64} * 1024;
 

@@ -8,8 +8,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-
 constexpr char kUnresolved[] = "folder:16 Failed to get full path from /none/a";
 
 static_assert(std::is_copy_constructible_v<Folder> && std::is_copy_assignable_v<Folder>);

@@ -11,9 +11,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 constexpr std::size_t kMostFolders = 1000;
 constexpr char kAllChanged[] = R"({"document":true,"audio":true,"video":true,"photo":true})";
 constexpr char kNoneChanged[] = R"({"document":false,"audio":false,"video":false,"photo":false})";

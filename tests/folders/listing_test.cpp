@@ -13,10 +13,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::UnorderedElementsAre;
-
 using Names = std::vector<std::string>;
 
 const std::string kStatus = "status";

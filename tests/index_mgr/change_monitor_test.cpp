@@ -6,8 +6,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 using namespace std::string_literals;
 
 class ChangeMonitorTest : public IndexMgrTest {};

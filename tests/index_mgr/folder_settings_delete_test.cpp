@@ -8,9 +8,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
-using ::testing::IsEmpty;
 using namespace std::string_literals;
 
 std::string Told(const std::string &path) {
@@ -338,180 +335,77 @@ TEST_F(DeleteTest, ANumberIsThePathOfItsDigits) {
 
 // --- each step failing in turn ------------------------------------------------------------------
 
-struct FailingStep {
-    const char *name;
-    Obstacle (*arrange)(FakePlatform &platform);
-    bool daemonRuns;
-    std::size_t steps; // how many of AllSteps() happen
-    std::vector<std::string> log;
-    _tag_fileindex_err_ error;
-    int leaks; // descriptors that the lock's attempts leave open
-};
-
 class DeleteFailureTest : public DeleteTest, public ::testing::WithParamInterface<FailingStep> {};
 
 TEST_P(DeleteFailureTest, EndsTheOperationAndLeavesWhatWasDone) {
-    const FailingStep &row = GetParam();
-    SetPlatformError();
-    const auto daemon = row.daemonRuns ? std::make_unique<DaemonPeer>() : nullptr;
-    const Obstacle obstacle = row.arrange(platform);
-    Watch();
-    EXPECT_FALSE(IndexMgr::Delete(TwoOfThree()));
-    ExpectLeakedDescriptors(row.leaks);
-    ExpectError(row.error);
-    ExpectLog(row.log);
-    std::vector<std::string> expected = AllSteps();
-    expected.resize(row.steps);
-    EXPECT_THAT(Steps(), ElementsAreArray(expected));
-    Fault::Reset();
-    if (row.steps > 0) {
+    ExpectFailure(
+        GetParam(), [] { return IndexMgr::Delete(TwoOfThree()); }, AllSteps());
+    if (GetParam().steps > 0) {
         EXPECT_THAT(StoredPaths(), ElementsAre("/photos/b"));
     }
 }
 
-// Removes a share at its first `function`.
-void RemoveShareAt(FakePlatform &platform, const char *function, const char *share) {
-    platform.On(function, [share](const std::string &) -> std::optional<int> {
-        FakePlatform::Get().RemoveShare(share);
-        return std::nullopt;
-    });
+INSTANTIATE_TEST_SUITE_P(First, DeleteFailureTest, ::testing::ValuesIn(FailuresBeforeAnyStep()),
+                         NameOfRow());
+
+// Once both commands have been sent.
+Arrangement SettingsUnreadable() {
+    return [] {
+        Fault::Before(Call::Connect, [left = 2](CallInfo &) mutable {
+            if (--left == 0) {
+                Fault::FailPath(Call::Open, "folder.conf", EMFILE);
+            }
+        });
+        return nullptr;
+    };
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Rows, DeleteFailureTest,
-    ::testing::Values(
-        FailingStep{"LockHeld",
-                    [](FakePlatform &) -> Obstacle {
-                        Fault::Quiet(Call::Usleep);
-                        return std::make_shared<HoldLock>(kFolderLock);
-                    },
-                    true,
-                    0,
-                    {"config:74 Failed to lock folder"},
-                    FILEINDEX_ERR_LOCK,
-                    2},
-        FailingStep{"SettingsNoJson",
-                    [](FakePlatform &) -> Obstacle {
-                        PutFile(kFolderFile, "x");
-                        return nullptr;
-                    },
-                    true,
-                    0,
-                    {"config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf"},
-                    FILEINDEX_ERR_LOAD,
-                    0},
-        FailingStep{"SettingsOfAnotherShape",
-                    [](FakePlatform &) -> Obstacle {
-                        PutFile(kFolderFile, "7");
-                        return nullptr;
-                    },
-                    true,
-                    0,
-                    {"folders:80 Malformed folders: 7"},
-                    FILEINDEX_ERR_MALFORMED,
-                    0},
-        FailingStep{"SaveOnAFullDisk",
-                    [](FakePlatform &) -> Obstacle {
-                        Fault::FailAlways(Call::Write, ENOSPC);
-                        return nullptr;
-                    },
-                    true,
-                    0,
-                    {"config:38 Failed to save json to /usr/vano/etc/fileindex/folder.conf"},
-                    FILEINDEX_ERR_SAVE,
-                    0},
-        FailingStep{"NoDaemon",
-                    [](FakePlatform &) -> Obstacle { return nullptr; },
-                    false,
-                    1,
-                    {"index_mgr:* SendCammandToDaemon failed"},
-                    FILEINDEX_ERR_NONE,
-                    0},
-        FailingStep{"DaemonGoneAfterTheFirstCommand",
-                    [](FakePlatform &) -> Obstacle {
-                        Fault::Fail(Call::Connect, ECONNREFUSED, 2);
-                        return nullptr;
-                    },
-                    true,
-                    2,
-                    {"index_mgr:* SendCammandToDaemon failed"},
-                    FILEINDEX_ERR_NONE,
-                    0},
-        FailingStep{"PathGoneBeforeItsEvent",
-                    [](FakePlatform &) -> Obstacle {
-                        Fault::On(Call::Connect, [](CallInfo &) -> std::optional<long> {
-                            FakePlatform::Get().RemoveShare("photos");
-                            return std::nullopt;
-                        });
-                        return nullptr;
-                    },
-                    true,
-                    3,
-                    {"index_mgr:* GetFullPath failed, path=/photos/a", "index_mgr:* Update failed"},
-                    FILEINDEX_ERR_PATH,
-                    0},
-        FailingStep{"MonitorRefusesAShareThatRemains",
-                    [](FakePlatform &platform) -> Obstacle {
-                        platform.Answer("MonitorQueue::Upsert", {0});
-                        return nullptr;
-                    },
-                    true,
-                    5,
-                    {"index_mgr:* MonitorQueue::Add failed",
-                     "index_mgr:* UpsertVANotifydCfg failed, share=photos"},
-                    FILEINDEX_ERR_NONE,
-                    0},
-        FailingStep{"SettingsUnreadableWhenTheSharesAreSettled",
-                    [](FakePlatform &) -> Obstacle {
-                        Fault::On(Call::Connect, [left = 2](CallInfo &) mutable {
-                            if (--left == 0) {
-                                Fault::FailPath(Call::Open, "folder.conf", EMFILE);
-                            }
-                            return std::optional<long>();
-                        });
-                        return nullptr;
-                    },
-                    true,
-                    4, // no index is removed on the word of settings that cannot be read
-                    {"config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf"},
-                    FILEINDEX_ERR_LOAD,
-                    0},
-        FailingStep{"ShareGoneBeforeItsIndexIsRemoved",
-                    [](FakePlatform &platform) -> Obstacle {
-                        RemoveShareAt(platform, "MonitorQueue::Upsert", "video");
-                        return nullptr;
-                    },
-                    true,
-                    5,
-                    {"utils:772 VANOShareGet failed, name=video, code=171",
-                     "index_mgr:* FILEIDXQueuePathGet failed, share=video",
-                     "index_mgr:* CleanShareIndexData failed, share=video"},
-                    FILEINDEX_ERR_NONE,
-                    0},
-        FailingStep{"ShareGoneWhileItsIndexIsRemoved",
-                    [](FakePlatform &platform) -> Obstacle {
-                        RemoveShareAt(platform, "VLIBCExec", "video");
-                        return nullptr;
-                    },
-                    true,
-                    7,
-                    {"utils:736 VANOShareGet failed, name=video, code=171",
-                     "index_mgr:* FILEIDXDBPathGet failed, share=video",
-                     "index_mgr:* CleanShareIndexData failed, share=video"},
-                    FILEINDEX_ERR_NONE,
-                    0},
-        FailingStep{"MonitorKeepsAShareThatIsDropped",
-                    [](FakePlatform &platform) -> Obstacle {
-                        platform.Answer("MonitorQueue::Delete", {0});
-                        return nullptr;
-                    },
-                    true,
-                    9,
-                    {"index_mgr:* MonitorQueue::Delete failed",
-                     "index_mgr:* DeleteVANtifydCfg failed, share=video"},
-                    FILEINDEX_ERR_NONE,
-                    0}),
-    NameOfRow());
+const FailingStep kFailingSteps[] = {
+    {"NoDaemon",
+     NothingInTheWay(),
+     1,
+     {"index_mgr:* SendCammandToDaemon failed"},
+     FILEINDEX_ERR_NONE,
+     false},
+    {"DaemonGoneAfterTheFirstCommand",
+     Refused(Call::Connect, ECONNREFUSED, 2),
+     2,
+     {"index_mgr:* SendCammandToDaemon failed"}},
+    {"PathGoneBeforeItsEvent",
+     Gone("photos", Call::Connect),
+     3,
+     {"index_mgr:* GetFullPath failed, path=/photos/a", "index_mgr:* Update failed"},
+     FILEINDEX_ERR_PATH},
+    {"MonitorRefusesAShareThatRemains",
+     Refused("MonitorQueue::Upsert", {0}),
+     5,
+     {"index_mgr:* MonitorQueue::Add failed",
+      "index_mgr:* UpsertVANotifydCfg failed, share=photos"}},
+    // No index is removed on the word of settings that cannot be read.
+    {"SettingsUnreadableWhenTheSharesAreSettled",
+     SettingsUnreadable(),
+     4,
+     {"config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf"},
+     FILEINDEX_ERR_LOAD},
+    {"ShareGoneBeforeItsIndexIsRemoved",
+     Gone("video", "MonitorQueue::Upsert"),
+     5,
+     {"utils:772 VANOShareGet failed, name=video, code=171",
+      "index_mgr:* FILEIDXQueuePathGet failed, share=video",
+      "index_mgr:* CleanShareIndexData failed, share=video"}},
+    {"ShareGoneWhileItsIndexIsRemoved",
+     Gone("video", "VLIBCExec"),
+     7,
+     {"utils:736 VANOShareGet failed, name=video, code=171",
+      "index_mgr:* FILEIDXDBPathGet failed, share=video",
+      "index_mgr:* CleanShareIndexData failed, share=video"}},
+    {"MonitorKeepsAShareThatIsDropped",
+     Refused("MonitorQueue::Delete", {0}),
+     9,
+     {"index_mgr:* MonitorQueue::Delete failed",
+      "index_mgr:* DeleteVANtifydCfg failed, share=video"}}};
+
+INSTANTIATE_TEST_SUITE_P(Later, DeleteFailureTest, ::testing::ValuesIn(kFailingSteps), NameOfRow());
 
 TEST_F(DeleteTest, AnEventThatCannotBeQueuedMarksTheShareAndEndsTheOperation) {
     RemoveTree(QueueOf(kPhotos));
@@ -535,13 +429,6 @@ TEST_F(DeleteTest, RemovalsThatFailAreNoFailure) {
 
 // --- the services when the last folder goes ------------------------------------------------------
 
-struct ServiceFailure {
-    const char *name;
-    const char *function;
-    std::vector<std::string> services;
-    const char *log;
-};
-
 class DeleteServiceTest : public DeleteTest,
                           public ::testing::WithParamInterface<ServiceFailure> {};
 
@@ -552,64 +439,28 @@ TEST_P(DeleteServiceTest, AFailureIsLoggedOnly) {
     platform.AnswerAlways(GetParam().function, -1);
     Watch();
     EXPECT_TRUE(IndexMgr::Delete(Paths({"/photos/a"})));
-    ExpectLog({GetParam().log});
+    ExpectLog({"index_mgr:* "s + GetParam().function + " failed: err=[0x00AB service.c:77]"});
     ExpectError(FILEINDEX_ERR_NONE);
     EXPECT_THAT(Steps(), ElementsAreArray(std::vector<std::string>{Changed(kFolderFile)} +
                                           GetParam().services + Dropped(kPhotos)));
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Rows, DeleteServiceTest,
-    ::testing::Values(
-        ServiceFailure{"Stop",
-                       "VLIBServiceStop",
-                       {kStopped, kSpotlightOff, kRestarted},
-                       "index_mgr:* VLIBServiceStop failed: err=[0x00AB service.c:77]"},
-        ServiceFailure{"Spotlight",
-                       "VANOSMBSetSpotlight",
-                       {kStopped, kSpotlightOff},
-                       "index_mgr:* VANOSMBSetSpotlight failed: err=[0x00AB service.c:77]"},
-        ServiceFailure{"Restart",
-                       "VLIBServiceRestart",
-                       {kStopped, kSpotlightOff, kRestarted},
-                       "index_mgr:* VLIBServiceRestart failed: err=[0x00AB service.c:77]"}),
-    NameOfRow());
+INSTANTIATE_TEST_SUITE_P(Rows, DeleteServiceTest, ::testing::ValuesIn(ServiceFailures()),
+                         NameOfRow());
 
 // --- the lock -----------------------------------------------------------------------------------
 
 TEST_F(DeleteTest, TheLockIsHeldDuringEverySideEffect) {
-    std::vector<std::string> unlocked;
-    std::size_t looks = 0;
-    const auto look = [&](const std::string &where) {
-        ++looks;
-        if (!IsLocked(kFolderLock)) {
-            unlocked.push_back(where);
-        }
-    };
-    for (const char *function : {"MonitorQueue::Upsert", "MonitorQueue::Delete", "VLIBCExec",
-                                 "VLIBServiceStop", "VANOSMBSetSpotlight", "VLIBServiceRestart"}) {
-        platform.On(function, [look, function](const std::string &) -> std::optional<int> {
-            look(function);
-            return std::nullopt;
-        });
-    }
-    Fault::On(Call::Connect, [look](CallInfo &) -> std::optional<long> {
-        look("command");
-        return std::nullopt;
-    });
-    Fault::On(Call::Write, [look](CallInfo &info) -> std::optional<long> {
-        if (info.path == QueueOf(kPhotos)) {
-            look("event");
-        }
-        return std::nullopt;
-    });
+    WatchLockAt({"MonitorQueue::Upsert", "MonitorQueue::Delete", "VLIBCExec", "VLIBServiceStop",
+                 "VANOSMBSetSpotlight", "VLIBServiceRestart"},
+                {Call::Connect, Call::Write});
     platform.spotlight = true;
     const DaemonPeer daemon;
     EXPECT_TRUE(IndexMgr::Delete(TwoOfThree()));
-    EXPECT_EQ(looks, 8U); // 2 commands, 1 event, 2 monitor calls, 3 removals
+    EXPECT_EQ(held.size(), 8U); // 2 commands, 1 event, 2 monitor calls, 3 removals
     EXPECT_TRUE(IndexMgr::Delete(Paths({"/photos/b"})));
-    EXPECT_EQ(looks, 15U); // 3 service calls, 3 removals, 1 monitor call
-    EXPECT_THAT(unlocked, IsEmpty());
+    EXPECT_EQ(held.size(), 15U); // 3 service calls, 3 removals, 1 monitor call
+    EXPECT_THAT(unheld, IsEmpty());
 }
 
 TEST_F(DeleteTest, AnExceptionReleasesTheLock) {

@@ -8,9 +8,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 constexpr char kLoadFailed[] =
     "config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf";
 
@@ -32,10 +29,7 @@ TEST_F(GetTest, OneSettingIsGivenAsItIsStored) {
 TEST_F(GetTest, TheLockIsHeldExclusivelyWhileTheSettingsAreRead) {
     PutFolders({"/photos/a"});
     bool locked = false;
-    platform.On("VANOShareGet", [&](const std::string &) -> std::optional<int> {
-        locked = IsLocked(kFolderLock);
-        return std::nullopt;
-    });
+    platform.Before("VANOShareGet", [&] { locked = IsLocked(kFolderLock); });
     Watch();
     Fault::Record(Call::Flock);
     Json::Value out;

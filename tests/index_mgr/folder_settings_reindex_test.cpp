@@ -6,10 +6,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::Field;
-using ::testing::IsEmpty;
 using namespace std::string_literals;
 
 const Json::Value kNoData;

@@ -10,9 +10,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
-using ::testing::IsEmpty;
 using namespace std::string_literals;
 
 const std::string kUpsert = "upsert_folder_setting";
@@ -407,173 +404,56 @@ TEST_F(UpsertTest, FieldsOfAnotherTypeAreNoBadElements) {
 
 // --- each step failing in turn ------------------------------------------------------------------
 
-struct FailingStep {
-    const char *name;
-    Obstacle (*arrange)(FakePlatform &platform);
-    bool daemonRuns;
-    std::size_t steps; // how many of AllSteps() happen, the failing one included where it is one
-    std::vector<std::string> log;
-    _tag_fileindex_err_ error;
-    int leaks; // descriptors that the lock's attempts leave open
-};
-
 class UpsertFailureTest : public UpsertTest, public ::testing::WithParamInterface<FailingStep> {};
 
 TEST_P(UpsertFailureTest, EndsTheOperationAndLeavesWhatWasDone) {
-    const FailingStep &row = GetParam();
-    SetPlatformError();
-    const auto daemon = row.daemonRuns ? std::make_unique<DaemonPeer>() : nullptr;
-    const Obstacle obstacle = row.arrange(platform);
-    Watch();
-    EXPECT_FALSE(IndexMgr::Upsert(TwoFolders()));
-    ExpectLeakedDescriptors(row.leaks);
-    ExpectError(row.error);
-    ExpectLog(row.log);
-    std::vector<std::string> expected = AllSteps();
-    expected.resize(row.steps);
-    EXPECT_THAT(Steps(), ElementsAreArray(expected));
-    if (row.steps > 0) {
+    ExpectFailure(
+        GetParam(), [] { return IndexMgr::Upsert(TwoFolders()); }, AllSteps());
+    if (GetParam().steps > 0) {
         EXPECT_THAT(StoredPaths(), ElementsAre("/photos/a", "/video/b"));
     }
 }
 
-constexpr char kSaveFailed[] =
-    "config:38 Failed to save json to /usr/vano/etc/fileindex/folder.conf";
-constexpr char kLoadFailed[] =
-    "config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf";
+INSTANTIATE_TEST_SUITE_P(First, UpsertFailureTest, ::testing::ValuesIn(FailuresBeforeAnyStep()),
+                         NameOfRow());
 
-INSTANTIATE_TEST_SUITE_P(
-    Rows, UpsertFailureTest,
-    ::testing::Values(FailingStep{"LockHeld",
-                                  [](FakePlatform &) -> Obstacle {
-                                      Fault::Quiet(Call::Usleep);
-                                      return std::make_shared<HoldLock>(kFolderLock);
-                                  },
-                                  true,
-                                  0,
-                                  {"config:74 Failed to lock folder"},
-                                  FILEINDEX_ERR_LOCK,
-                                  2},
-                      FailingStep{"LockFileRefused",
-                                  [](FakePlatform &) -> Obstacle {
-                                      Fault::FailPath(Call::Open, "fileidx_cfg_folder.lock",
-                                                      EACCES);
-                                      return nullptr;
-                                  },
-                                  true,
-                                  0,
-                                  {"config:74 Failed to lock folder"},
-                                  FILEINDEX_ERR_LOCK,
-                                  0},
-                      FailingStep{"SettingsNoJson",
-                                  [](FakePlatform &) -> Obstacle {
-                                      PutFile(kFolderFile, "{");
-                                      return nullptr;
-                                  },
-                                  true,
-                                  0,
-                                  {kLoadFailed},
-                                  FILEINDEX_ERR_LOAD,
-                                  0},
-                      FailingStep{"SettingsOfAnotherShape",
-                                  [](FakePlatform &) -> Obstacle {
-                                      PutFile(kFolderFile, "[ ]");
-                                      return nullptr;
-                                  },
-                                  true,
-                                  0,
-                                  {"folders:80 Malformed folders: []"},
-                                  FILEINDEX_ERR_MALFORMED,
-                                  0},
-                      FailingStep{"SaveOnAFullDisk",
-                                  [](FakePlatform &) -> Obstacle {
-                                      Fault::FailAlways(Call::Write, ENOSPC);
-                                      return nullptr;
-                                  },
-                                  true,
-                                  0,
-                                  {kSaveFailed},
-                                  FILEINDEX_ERR_SAVE,
-                                  0},
-                      FailingStep{"MonitorRefusesTheFirstShare",
-                                  [](FakePlatform &platform) -> Obstacle {
-                                      platform.Answer("MonitorQueue::Upsert", {0});
-                                      return nullptr;
-                                  },
-                                  true,
-                                  2,
-                                  {"index_mgr:* MonitorQueue::Add failed",
-                                   "index_mgr:* UpsertVANtifydCfg failed, share=photos"},
-                                  FILEINDEX_ERR_NONE,
-                                  0},
-                      FailingStep{"MonitorRefusesTheSecondShare",
-                                  [](FakePlatform &platform) -> Obstacle {
-                                      platform.Answer("MonitorQueue::Upsert", {1, 0});
-                                      return nullptr;
-                                  },
-                                  true,
-                                  3,
-                                  {"index_mgr:* MonitorQueue::Add failed",
-                                   "index_mgr:* UpsertVANtifydCfg failed, share=video"},
-                                  FILEINDEX_ERR_NONE,
-                                  0},
-                      FailingStep{"ShareGoneBeforeItsMonitor",
-                                  [](FakePlatform &platform) -> Obstacle {
-                                      platform.On("MonitorQueue::Upsert", [](const std::string &) {
-                                          FakePlatform::Get().RemoveShare("video");
-                                          return std::nullopt;
-                                      });
-                                      return nullptr;
-                                  },
-                                  true,
-                                  2,
-                                  {"utils:772 VANOShareGet failed, name=video, code=171",
-                                   "index_mgr:* FILEIDXQueuePathGet failed, share=video",
-                                   "index_mgr:* UpsertVANtifydCfg failed, share=video"},
-                                  FILEINDEX_ERR_NONE,
-                                  0},
-                      FailingStep{
-                          "ServiceDoesNotStart",
-                          [](FakePlatform &platform) -> Obstacle {
-                              platform.Answer("VLIBServiceStart", {-1});
-                              return nullptr;
-                          },
-                          true,
-                          4,
-                          {"index_mgr:* VLIBServiceStart failed: err=[0x00AB service.c:77]"},
-                          FILEINDEX_ERR_NONE,
-                          0},
-                      FailingStep{"NoDaemon",
-                                  [](FakePlatform &) -> Obstacle { return nullptr; },
-                                  false,
-                                  6,
-                                  {"index_mgr:* SendCammandToDaemon failed"},
-                                  FILEINDEX_ERR_NONE,
-                                  0},
-                      FailingStep{"DaemonGoneAfterTheFirstCommand",
-                                  [](FakePlatform &) -> Obstacle {
-                                      Fault::Fail(Call::Connect, ECONNREFUSED, 2);
-                                      return nullptr;
-                                  },
-                                  true,
-                                  7,
-                                  {"index_mgr:* SendCammandToDaemon failed"},
-                                  FILEINDEX_ERR_NONE,
-                                  0},
-                      FailingStep{"ShareGoneBeforeItsEvent",
-                                  [](FakePlatform &platform) -> Obstacle {
-                                      platform.On("VLIBServiceRestart", [](const std::string &) {
-                                          FakePlatform::Get().RemoveShare("video");
-                                          return std::nullopt;
-                                      });
-                                      return nullptr;
-                                  },
-                                  true,
-                                  9,
-                                  {"index_mgr:* GetFullPath failed, path=/video/b"},
-                                  FILEINDEX_ERR_PATH,
-                                  0}),
-    NameOfRow());
+const FailingStep kFailingSteps[] = {
+    {"MonitorRefusesTheFirstShare",
+     Refused("MonitorQueue::Upsert", {0}),
+     2,
+     {"index_mgr:* MonitorQueue::Add failed",
+      "index_mgr:* UpsertVANtifydCfg failed, share=photos"}},
+    {"MonitorRefusesTheSecondShare",
+     Refused("MonitorQueue::Upsert", {1, 0}),
+     3,
+     {"index_mgr:* MonitorQueue::Add failed", "index_mgr:* UpsertVANtifydCfg failed, share=video"}},
+    {"ShareGoneBeforeItsMonitor",
+     Gone("video", "MonitorQueue::Upsert"),
+     2,
+     {"utils:772 VANOShareGet failed, name=video, code=171",
+      "index_mgr:* FILEIDXQueuePathGet failed, share=video",
+      "index_mgr:* UpsertVANtifydCfg failed, share=video"}},
+    {"ServiceDoesNotStart",
+     Refused("VLIBServiceStart", {-1}),
+     4,
+     {"index_mgr:* VLIBServiceStart failed: err=[0x00AB service.c:77]"}},
+    {"NoDaemon",
+     NothingInTheWay(),
+     6,
+     {"index_mgr:* SendCammandToDaemon failed"},
+     FILEINDEX_ERR_NONE,
+     false},
+    {"DaemonGoneAfterTheFirstCommand",
+     Refused(Call::Connect, ECONNREFUSED, 2),
+     7,
+     {"index_mgr:* SendCammandToDaemon failed"}},
+    {"ShareGoneBeforeItsEvent",
+     Gone("video", "VLIBServiceRestart"),
+     9,
+     {"index_mgr:* GetFullPath failed, path=/video/b"},
+     FILEINDEX_ERR_PATH}};
+
+INSTANTIATE_TEST_SUITE_P(Later, UpsertFailureTest, ::testing::ValuesIn(kFailingSteps), NameOfRow());
 
 TEST_F(UpsertTest, AnEventThatCannotBeQueuedMarksTheShareAndEndsTheOperation) {
     RemoveTree(QueueOf(kPhotos));
@@ -653,45 +533,21 @@ TEST_F(UpsertTest, AFailingRestartIsLoggedOnly) {
 // --- the lock -----------------------------------------------------------------------------------
 
 TEST_F(UpsertTest, TheLockIsHeldDuringEverySideEffect) {
-    std::vector<std::string> seen;
-    const auto look = [&](const std::string &where) {
-        seen.push_back(where + (IsLocked(kFolderLock) ? " locked" : " UNLOCKED"));
-    };
-    for (const char *function :
-         {"MonitorQueue::Upsert", "VLIBServiceStart", "VANOSMBIsEnableSpotlight",
-          "VANOSMBSetSpotlight", "VLIBServiceRestart"}) {
-        platform.On(function, [look, function](const std::string &) -> std::optional<int> {
-            look(function);
-            return std::nullopt;
-        });
-    }
-    for (const Call call : {Call::Rename, Call::Connect}) {
-        Fault::On(call, [look, call](CallInfo &) -> std::optional<long> {
-            look(call == Call::Rename ? "save" : "command");
-            return std::nullopt;
-        });
-    }
-    Fault::On(Call::Write, [look](CallInfo &info) -> std::optional<long> {
-        if (info.path == QueueOf(kPhotos)) {
-            look("event");
-        }
-        return std::nullopt;
-    });
+    WatchLockAt({"MonitorQueue::Upsert", "VLIBServiceStart", "VANOSMBIsEnableSpotlight",
+                 "VANOSMBSetSpotlight", "VLIBServiceRestart"},
+                {Call::Rename, Call::Connect, Call::Write});
     const DaemonPeer daemon;
     EXPECT_TRUE(IndexMgr::Upsert(Json(R"([{"path":"/photos/a"}])")));
-    EXPECT_THAT(seen,
-                ElementsAre("save locked", "MonitorQueue::Upsert locked", "VLIBServiceStart locked",
-                            "VANOSMBIsEnableSpotlight locked", "VANOSMBSetSpotlight locked",
-                            "VLIBServiceRestart locked", "command locked", "event locked"));
+    EXPECT_THAT(held, ElementsAre("rename", "MonitorQueue::Upsert", "VLIBServiceStart",
+                                  "VANOSMBIsEnableSpotlight", "VANOSMBSetSpotlight",
+                                  "VLIBServiceRestart", "connect", "write"));
+    EXPECT_THAT(unheld, IsEmpty());
 }
 
 TEST_F(UpsertTest, AnotherWriterIsRefusedMeanwhile) {
     bool other = true;
     Fault::Quiet(Call::Usleep);
-    platform.On("VLIBServiceStart", [&](const std::string &) -> std::optional<int> {
-        other = IndexMgr::Upsert(Json("[]"));
-        return std::nullopt;
-    });
+    platform.Before("VLIBServiceStart", [&] { other = IndexMgr::Upsert(Json("[]")); });
     EXPECT_TRUE(IndexMgr::Upsert(Json("[]")));
     EXPECT_FALSE(other);
     EXPECT_EQ(platform.Calls("VLIBServiceStart"), 1U);
@@ -732,7 +588,7 @@ TEST_F(UpsertTest, AnExceptionBelowAnEntryPointForCIsAFailure) {
 
 TEST_F(UpsertTest, TheLockIsTakenOncePerCall) {
     const DaemonPeer daemon;
-    Fault::On(Call::Flock, [](CallInfo &) -> std::optional<long> { return std::nullopt; });
+    Fault::Count(Call::Flock);
     EXPECT_TRUE(IndexMgr::Upsert(TwoFolders()));
     std::vector<long> operations;
     for (const CallInfo &call : Fault::Log(Call::Flock)) {

@@ -1,19 +1,11 @@
 #include "index_mgr/index_mgr_fixture.h"
 
 #include <algorithm>
-#include <json/writer.h>
 #include <sstream>
 
 namespace VANO::TESTS {
 
 namespace {
-
-std::string Compact(const Json::Value &value) {
-    Json::StreamWriterBuilder settings;
-    settings["indentation"] = "";
-    settings["emitUTF8"] = true;
-    return Json::writeString(settings, value);
-}
 
 bool StartsWith(const std::string &text, const std::string &start) {
     return text.compare(0, start.size(), start) == 0;
@@ -49,7 +41,7 @@ std::string Told(const std::string &command, const std::string &key, const std::
     Json::Value message(Json::objectValue);
     message["type"] = command;
     message["data"][key] = value;
-    return "socket: " + Compact(message);
+    return "socket: " + CompactText(message);
 }
 
 std::string Watched(const std::string &directory, const std::vector<std::string> &fullPaths) {
@@ -63,7 +55,7 @@ std::string Watched(const std::string &directory, const std::vector<std::string>
         entry["ignore"].append("@eaDir");
         description["config"].append(entry);
     }
-    return "MonitorQueue::Upsert(" + Compact(description) + ", fileindex, 1)";
+    return "MonitorQueue::Upsert(" + CompactText(description) + ", fileindex, 1)";
 }
 
 std::string Unwatched(const std::string &directory) {
@@ -129,6 +121,126 @@ Json::Value Paths(const std::vector<std::string> &paths) {
     return array;
 }
 
+Arrangement NothingInTheWay() {
+    return [] { return nullptr; };
+}
+
+Arrangement SettingsHold(const std::string &text) {
+    return [text] {
+        PutFile(kFolderFile, text);
+        return nullptr;
+    };
+}
+
+Arrangement Refused(const std::string &platformFunction, const std::vector<int> &answers) {
+    return [platformFunction, answers] {
+        FakePlatform::Get().Answer(platformFunction, answers);
+        return nullptr;
+    };
+}
+
+Arrangement Refused(Call call, int error, int nth) {
+    return [call, error, nth] {
+        Fault::Fail(call, error, nth);
+        return nullptr;
+    };
+}
+
+Arrangement Gone(const std::string &share, const std::string &platformFunction) {
+    return [share, platformFunction] {
+        FakePlatform::Get().Before(platformFunction,
+                                   [share] { FakePlatform::Get().RemoveShare(share); });
+        return nullptr;
+    };
+}
+
+Arrangement Gone(const std::string &share, Call call) {
+    return [share, call] {
+        Fault::Before(call, [share](CallInfo &) { FakePlatform::Get().RemoveShare(share); });
+        return nullptr;
+    };
+}
+
+const std::vector<FailingStep> &FailuresBeforeAnyStep() {
+    const auto lockHeld = [] {
+        PutFile(kFolderFile, "{"); // is not read
+        Fault::Quiet(Call::Usleep);
+        return std::make_shared<HoldLock>(kFolderLock);
+    };
+    const auto lockRefused = [] {
+        Fault::FailPath(Call::Open, "fileidx_cfg_folder.lock", EACCES);
+        return nullptr;
+    };
+    const auto fullDisk = [] {
+        Fault::FailAlways(Call::Write, ENOSPC);
+        return nullptr;
+    };
+    static const std::string file(kFolderFile);
+    static const std::vector<FailingStep> steps = {
+        {"LockHeld", lockHeld, 0, {"config:74 Failed to lock folder"}, FILEINDEX_ERR_LOCK, true, 2},
+        {"LockFileRefused",
+         lockRefused,
+         0,
+         {"config:74 Failed to lock folder"},
+         FILEINDEX_ERR_LOCK},
+        {"SettingsNoJson",
+         SettingsHold("{"),
+         0,
+         {"config:22 Failed to load json from " + file},
+         FILEINDEX_ERR_LOAD},
+        {"SettingsOfAnotherShape",
+         SettingsHold("[ ]"),
+         0,
+         {"folders:80 Malformed folders: []"},
+         FILEINDEX_ERR_MALFORMED},
+        {"SaveOnAFullDisk",
+         fullDisk,
+         0,
+         {"config:38 Failed to save json to " + file},
+         FILEINDEX_ERR_SAVE}};
+    return steps;
+}
+
+const std::vector<ServiceFailure> &ServiceFailures() {
+    static const std::vector<ServiceFailure> failures = {
+        {"Stop", "VLIBServiceStop", {kStopped, kSpotlightOff, kRestarted}},
+        {"Spotlight", "VANOSMBSetSpotlight", {kStopped, kSpotlightOff}},
+        {"Restart", "VLIBServiceRestart", {kStopped, kSpotlightOff, kRestarted}}};
+    return failures;
+}
+
+void IndexMgrTest::ExpectFailure(const FailingStep &row, const std::function<bool()> &operation,
+                                 std::vector<std::string> allSteps) {
+    SetPlatformError();
+    const auto daemon = row.daemonRuns ? std::make_unique<DaemonPeer>() : nullptr;
+    const Obstacle obstacle = row.arrange();
+    Watch();
+    EXPECT_FALSE(operation());
+    ExpectLeakedDescriptors(row.leaks);
+    ExpectError(row.error);
+    ExpectLog(row.log);
+    allSteps.resize(row.steps);
+    EXPECT_EQ(Steps(), allSteps);
+    Fault::Reset();
+}
+
+void IndexMgrTest::WatchLockAt(const std::vector<std::string> &platformFunctions,
+                               const std::vector<Call> &calls) {
+    const auto look = [this](const std::string &what) {
+        (IsLocked(kFolderLock) ? held : unheld).push_back(what);
+    };
+    for (const std::string &function : platformFunctions) {
+        platform.Before(function, [look, function] { look(function); });
+    }
+    for (const Call call : calls) {
+        Fault::Before(call, [look](CallInfo &info) {
+            if (info.call != Call::Write || info.path == QueueOf(kPhotos)) {
+                look(info.Name());
+            }
+        });
+    }
+}
+
 void IndexMgrTest::SetUp() {
     LibraryTest::SetUp();
     platform.AddShare("photos", kPhotos);
@@ -144,7 +256,7 @@ void IndexMgrTest::PutFolders(const std::vector<std::string> &paths) {
     for (const std::string &path : paths) {
         settings[path] = PhotoFolder(path);
     }
-    PutFile(kFolderFile, Compact(settings));
+    PutFile(kFolderFile, CompactText(settings));
 }
 
 std::vector<std::string> IndexMgrTest::StoredPaths() {

@@ -9,6 +9,7 @@
 //     EXPECT_TRUE(IndexMgr::Reindex(Json(R"(["/photos/a"])")));
 //     EXPECT_THAT(Steps(), ElementsAre(Changed(QueueOf("/volume1/photos"))));
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -60,6 +61,37 @@ Json::Value Paths(const std::vector<std::string> &paths);
 
 // What stands in an operation's way while it runs.
 using Obstacle = std::shared_ptr<void>;
+using Arrangement = std::function<Obstacle()>;
+
+Arrangement NothingInTheWay();
+Arrangement SettingsHold(const std::string &text);
+Arrangement Refused(const std::string &platformFunction, const std::vector<int> &answers);
+Arrangement Refused(Call call, int error, int nth); // the nth call
+Arrangement Gone(const std::string &share,
+                 const std::string &platformFunction); // at its first call
+Arrangement Gone(const std::string &share, Call call);
+
+// One step of an operation that fails, and what has been done by then.
+struct FailingStep {
+    const char *name;
+    Arrangement arrange;
+    std::size_t steps; // how many of all steps happen, the failing one included where it is one
+    std::vector<std::string> log;
+    _tag_fileindex_err_ error = FILEINDEX_ERR_NONE;
+    bool daemonRuns = true;
+    int leaks = 0; // descriptors that the lock's attempts leave open
+};
+
+// What ends every operation that changes the folder settings before it has done anything.
+const std::vector<FailingStep> &FailuresBeforeAnyStep();
+
+// What fails when the service is stopped and Spotlight switched off, and what is tried of it.
+struct ServiceFailure {
+    const char *name;
+    const char *function;
+    std::vector<std::string> services;
+};
+const std::vector<ServiceFailure> &ServiceFailures();
 
 // Names a parameterised test after its row's `name`.
 struct NameOfRow {
@@ -84,6 +116,17 @@ class IndexMgrTest : public LibraryTest {
 
     // The effects without those that accompany others: log lines and metadata directories.
     static std::vector<std::string> Steps();
+
+    // The operation fails as the row says; of its steps only the first are done.
+    void ExpectFailure(const FailingStep &row, const std::function<bool()> &operation,
+                       std::vector<std::string> allSteps = {});
+
+    // From now on notes of every such call whether the lock on the folder settings is held; of
+    // writes only those to the queue of photos count.
+    void WatchLockAt(const std::vector<std::string> &platformFunctions,
+                     const std::vector<Call> &calls);
+    std::vector<std::string> held; // "MonitorQueue::Upsert", "rename" ...
+    std::vector<std::string> unheld;
 
     // The platform's last error, as failed platform calls are logged with it:
     // "err=[0x00AB service.c:77]".

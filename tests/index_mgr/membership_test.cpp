@@ -10,9 +10,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::Each;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 using namespace std::string_literals;
 
 class MembershipTest : public IndexMgrTest {};

@@ -8,17 +8,7 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
-using ::testing::IsEmpty;
 using namespace std::string_literals;
-
-constexpr char kLoadFailed[] =
-    "config:22 Failed to load json from /usr/vano/etc/fileindex/folder.conf";
-constexpr char kSaveFailed[] =
-    "config:38 Failed to save json to /usr/vano/etc/fileindex/folder.conf";
-constexpr char kLockFailed[] = "config:74 Failed to lock folder";
 
 // --- ShareRemove --------------------------------------------------------------------------------
 
@@ -96,13 +86,6 @@ TEST_F(ShareRemoveTest, TheEmptyNameStandsForEveryShare) {
     EXPECT_EQ(ReadJson(kFolderFile), Json("{}"));
 }
 
-struct ServiceFailure {
-    const char *name;
-    const char *function;
-    std::vector<std::string> services;
-    const char *log;
-};
-
 class ShareRemoveServiceTest : public ShareRemoveTest,
                                public ::testing::WithParamInterface<ServiceFailure> {};
 
@@ -113,42 +96,23 @@ TEST_P(ShareRemoveServiceTest, AFailureIsLoggedOnly) {
     platform.AnswerAlways(GetParam().function, -1);
     Watch();
     EXPECT_TRUE(IndexMgr::ShareRemove("photos"));
-    ExpectLog({GetParam().log});
+    ExpectLog({"index_mgr:* "s + GetParam().function + " failed: err=[0x00AB service.c:77]"});
     ExpectError(FILEINDEX_ERR_NONE);
     std::vector<std::string> expected = GetParam().services;
     expected.insert(expected.begin(), Changed(kFolderFile));
     EXPECT_THAT(Steps(), ElementsAreArray(expected));
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Rows, ShareRemoveServiceTest,
-    ::testing::Values(
-        ServiceFailure{"Stop",
-                       "VLIBServiceStop",
-                       {kStopped, kSpotlightOff, kRestarted},
-                       "index_mgr:* VLIBServiceStop failed: err=[0x00AB service.c:77]"},
-        ServiceFailure{"Spotlight",
-                       "VANOSMBSetSpotlight",
-                       {kStopped, kSpotlightOff},
-                       "index_mgr:* VANOSMBSetSpotlight failed: err=[0x00AB service.c:77]"},
-        ServiceFailure{"Restart",
-                       "VLIBServiceRestart",
-                       {kStopped, kSpotlightOff, kRestarted},
-                       "index_mgr:* VLIBServiceRestart failed: err=[0x00AB service.c:77]"}),
-    NameOfRow());
+INSTANTIATE_TEST_SUITE_P(Rows, ShareRemoveServiceTest, ::testing::ValuesIn(ServiceFailures()),
+                         NameOfRow());
 
 TEST_F(ShareRemoveTest, TheLockIsHeldWhileTheServicesAreStopped) {
     PutFolders({"/photos/a"});
     platform.spotlight = true;
-    std::vector<bool> locked;
-    for (const char *function : {"VLIBServiceStop", "VANOSMBSetSpotlight", "VLIBServiceRestart"}) {
-        platform.On(function, [&](const std::string &) -> std::optional<int> {
-            locked.push_back(IsLocked(kFolderLock));
-            return std::nullopt;
-        });
-    }
+    WatchLockAt({"VLIBServiceStop", "VANOSMBSetSpotlight", "VLIBServiceRestart"}, {});
     EXPECT_TRUE(IndexMgr::ShareRemove("photos"));
-    EXPECT_THAT(locked, ElementsAre(true, true, true));
+    EXPECT_THAT(held, ElementsAre("VLIBServiceStop", "VANOSMBSetSpotlight", "VLIBServiceRestart"));
+    EXPECT_THAT(unheld, IsEmpty());
 }
 
 // --- ShareRename --------------------------------------------------------------------------------
@@ -277,63 +241,20 @@ bool Rename() {
 
 class ShareSettingsTest : public IndexMgrTest, public ::testing::WithParamInterface<bool (*)()> {};
 
-TEST_P(ShareSettingsTest, AHeldLockIsAnErrorAndNothingIsRead) {
-    PutFile(kFolderFile, "{");
-    Fault::Quiet(Call::Usleep);
-    const HoldLock lock(kFolderLock);
-    Watch();
-    EXPECT_FALSE(GetParam()());
-    ExpectLeakedDescriptors(2);
-    ExpectError(FILEINDEX_ERR_LOCK);
-    ExpectLog({kLockFailed});
-    EXPECT_THAT(Steps(), IsEmpty());
-}
-
-TEST_P(ShareSettingsTest, SettingsThatCannotBeLoadedAreAnError) {
-    PutFile(kFolderFile, "{");
-    Watch();
-    EXPECT_FALSE(GetParam()());
-    ExpectError(FILEINDEX_ERR_LOAD);
-    ExpectLog({kLoadFailed});
-    PutFile(kFolderFile, "[]");
-    Watch();
-    EXPECT_FALSE(GetParam()());
-    ExpectError(FILEINDEX_ERR_MALFORMED);
-    ExpectLog({"folders:80 Malformed folders: []"});
-    EXPECT_THAT(Steps(), IsEmpty());
-}
-
-TEST_P(ShareSettingsTest, SettingsThatCannotBeSavedAreAnError) {
-    PutFolders({"/photos/a"});
-    Fault::FailAlways(Call::Write, ENOSPC);
-    Watch();
-    EXPECT_FALSE(GetParam()());
-    ExpectError(FILEINDEX_ERR_SAVE);
-    ExpectLog({kSaveFailed});
-    EXPECT_THAT(Steps(), IsEmpty());
+TEST_P(ShareSettingsTest, AFailureBeforeAnyStepIsAnError) {
+    for (const FailingStep &row : FailuresBeforeAnyStep()) {
+        SCOPED_TRACE(row.name);
+        PutFolders({"/photos/a"});
+        ExpectFailure(row, GetParam());
+    }
 }
 
 TEST_P(ShareSettingsTest, TheLockIsHeldWhileTheSettingsAreReadAndWritten) {
     PutFolders({"/photos/a"});
-    std::vector<std::string> unlocked;
-    std::size_t looks = 0;
-    const auto look = [&](const std::string &where) {
-        ++looks;
-        if (!IsLocked(kFolderLock)) {
-            unlocked.push_back(where);
-        }
-    };
-    platform.On("VANOShareGet", [look](const std::string &entry) -> std::optional<int> {
-        look(entry);
-        return std::nullopt;
-    });
-    Fault::On(Call::Rename, [look](CallInfo &) -> std::optional<long> {
-        look("save");
-        return std::nullopt;
-    });
+    WatchLockAt({"VANOShareGet"}, {Call::Rename});
     EXPECT_TRUE(GetParam()());
-    EXPECT_GE(looks, 3U);
-    EXPECT_THAT(unlocked, IsEmpty());
+    EXPECT_GE(held.size(), 3U);
+    EXPECT_THAT(unheld, IsEmpty());
 }
 
 TEST_P(ShareSettingsTest, AnExceptionReleasesTheLock) {
@@ -528,10 +449,7 @@ TEST_F(CleanShareIndexDataTest, ANameWithAZeroByteIsNoShares) {
 }
 
 TEST_F(CleanShareIndexDataTest, AShareThatVanishesMeanwhileKeepsItsDatabase) {
-    platform.On("VLIBCExec", [&](const std::string &) -> std::optional<int> {
-        platform.RemoveShare("photos");
-        return std::nullopt;
-    });
+    platform.Before("VLIBCExec", [&] { platform.RemoveShare("photos"); });
     Watch();
     EXPECT_FALSE(IndexMgr::CleanShareIndexData("photos"));
     ExpectLog({"utils:736 VANOShareGet failed, name=photos, code=0",

@@ -2,10 +2,10 @@
 #include <string>
 
 #include "fuse_server.h"
-#include "mounts.h"
 #include "platform/linux/error_codes.h"
 #include "platform/linux/fs_type.h"
 #include "platform/vano_platform.h"
+#include "support/mounts.h"
 
 namespace {
 

@@ -5,7 +5,7 @@
 #include <string>
 
 #include "base/unique_fd.h"
-#include "mounts.h"
+#include "support/mounts.h"
 
 namespace {
 

@@ -13,9 +13,9 @@
 #include <sys/syscall.h>
 #include <unistd.h>
 
-#include "mounts.h"
 #include "platform/linux/error_codes.h"
 #include "platform/vano_platform.h"
+#include "support/mounts.h"
 
 namespace {
 

@@ -5,10 +5,10 @@
 #include <sys/stat.h>
 #include <vector>
 
-#include "mounts.h"
 #include "platform/diagnosis.h"
 #include "platform/linux/error_codes.h"
 #include "platform/vano_platform.h"
+#include "support/mounts.h"
 
 namespace {
 

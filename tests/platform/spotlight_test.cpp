@@ -3,9 +3,9 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
-#include "mounts.h"
 #include "platform/linux/error_codes.h"
 #include "platform/vano_platform.h"
+#include "support/mounts.h"
 
 namespace {
 

@@ -11,9 +11,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::StartsWith;
-
 constexpr long long kNow = 1700000000;
 constexpr char kFolder[] = "/photos/trip";
 constexpr char kQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";

@@ -13,9 +13,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 constexpr long long kNow = 1700000000;
 
 class StatusMgrTest : public LibraryTest {

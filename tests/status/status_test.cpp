@@ -9,9 +9,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 constexpr char kNotification[] =
     "VLIBCExecv(/usr/vano/bin/vanozemnotify, [/usr/vano/bin/vanozemnotify, -e, false, -c, "
     "VANO.KWX.AdminCenter.Application, @administrators, fileindex:fileindex_title, "

@@ -8,11 +8,11 @@
 #include <poll.h>
 #include <sys/eventfd.h>
 #include <sys/socket.h>
-#include <sys/un.h>
 #include <unistd.h>
 
 #include "support/event_trace.h"
 #include "support/files.h"
+#include "support/sockets.h"
 
 namespace VANO::TESTS {
 
@@ -20,7 +20,6 @@ namespace {
 
 constexpr char kSocketPath[] = "/var/run/fileindexd.sock";
 constexpr char kGarbage[] = "\xff{]garbage\n";
-constexpr int kBacklog = 64;
 
 // The peer that the event trace asks for news; there is one at a time.
 std::mutex &CurrentMutex() {
@@ -34,18 +33,6 @@ void SyncCurrent() {
     if (g_current != nullptr) {
         g_current->Sync();
     }
-}
-
-int Listen() {
-    const int fd = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::memcpy(address.sun_path, kSocketPath, sizeof(kSocketPath));
-    ::unlink(kSocketPath);
-    EXPECT_EQ(::bind(fd, reinterpret_cast<sockaddr *>(&address), sizeof(address)), 0)
-        << std::strerror(errno);
-    EXPECT_EQ(::listen(fd, kBacklog), 0);
-    return fd;
 }
 
 bool ParseJson(Json::Value &value, const std::string &text) {
@@ -68,7 +55,7 @@ struct DaemonPeer::Connection {
 
 DaemonPeer::DaemonPeer(Mode mode) : mode_(mode), listener_(-1), wake_(-1) {
     const KitScope kit;
-    listener_ = Listen();
+    listener_ = ListenAt(kSocketPath, SOCK_STREAM | SOCK_NONBLOCK);
     wake_ = ::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK);
     thread_ = std::thread(&DaemonPeer::Serve, this);
     static const bool registered = [] {

@@ -103,6 +103,13 @@ void FakePlatform::On(const std::string &function, Hook hook) {
     hooks_[function] = std::move(hook);
 }
 
+void FakePlatform::Before(const std::string &function, std::function<void()> action) {
+    On(function, [action = std::move(action)](const std::string & /*entry*/) {
+        action();
+        return std::optional<int>();
+    });
+}
+
 std::vector<std::string> FakePlatform::Trace() {
     return EventTrace::Get().Entries();
 }

@@ -69,6 +69,7 @@ class FakePlatform {
     // the middle of an operation.
     using Hook = std::function<std::optional<int>(const std::string &entry)>;
     void On(const std::string &function, Hook hook);
+    void Before(const std::string &function, std::function<void()> action); // no answer
 
     // The whole event trace; the platform's part of it; and how many calls a function had.
     std::vector<std::string> Trace();

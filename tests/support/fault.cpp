@@ -30,11 +30,39 @@ namespace {
 
 constexpr std::size_t kCallCount = static_cast<std::size_t>(Call::Count_);
 
-constexpr std::array<const char *, kCallCount> kNames = {
-    "chmod",     "close", "connect",   "fallocate", "fchmod", "fchown",     "flock",
-    "fstat",     "fsync", "ftruncate", "lstat",     "mkdir",  "mkostemp",   "open",
-    "open_path", "rand",  "read",      "realpath",  "rename", "setsockopt", "signal",
-    "socket",    "stat",  "time",      "unlink",    "usleep", "write"};
+// How a call looks in the trace: its name, and what stands behind its path.
+enum class Detail { None, OtherPath, Size, Number };
+struct Form {
+    const char *name;
+    Detail detail = Detail::None;
+};
+constexpr std::array<Form, kCallCount> kForms = {{{"chmod", Detail::Number},
+                                                  {"close"},
+                                                  {"connect"},
+                                                  {"fallocate"},
+                                                  {"fchmod", Detail::Number},
+                                                  {"fchown"},
+                                                  {"flock", Detail::Number},
+                                                  {"fstat"},
+                                                  {"fsync"},
+                                                  {"ftruncate", Detail::Number},
+                                                  {"lstat"},
+                                                  {"mkdir", Detail::Number},
+                                                  {"mkostemp"},
+                                                  {"open", Detail::Number},
+                                                  {"open_path", Detail::Number},
+                                                  {"rand"},
+                                                  {"read", Detail::Size},
+                                                  {"realpath"},
+                                                  {"rename", Detail::OtherPath},
+                                                  {"setsockopt", Detail::Number},
+                                                  {"signal", Detail::Number},
+                                                  {"socket"},
+                                                  {"stat"},
+                                                  {"time"},
+                                                  {"unlink"},
+                                                  {"usleep", Detail::Number},
+                                                  {"write", Detail::Size}}};
 
 struct Rules {
     std::shared_ptr<Fault::Hook> hook; // shared, so that a hook with a counter keeps counting
@@ -115,33 +143,27 @@ bool EndsWith(const std::string &text, const std::string &suffix) {
 } // namespace
 
 std::string CallInfo::Text() const {
-    std::string text = std::string(kNames[Index(call)]) + "(" + path;
-    switch (call) {
-    case Call::Rename:
-        text += ", " + otherPath;
+    const Form &form = kForms[Index(call)];
+    std::string detail;
+    switch (form.detail) {
+    case Detail::None:
         break;
-    case Call::Read:
-    case Call::Write:
-        text += ", " + std::to_string(size);
+    case Detail::OtherPath:
+        detail = otherPath;
         break;
-    case Call::Chmod:
-    case Call::Fchmod:
-    case Call::Flock:
-    case Call::Ftruncate:
-    case Call::Mkdir:
-    case Call::Open:
-    case Call::OpenPath:
-        text += ", " + std::to_string(number);
+    case Detail::Size:
+        detail = std::to_string(size);
         break;
-    case Call::Setsockopt:
-    case Call::Signal:
-    case Call::Usleep:
-        text += (path.empty() ? "" : ", ") + std::to_string(number);
-        break;
-    default:
+    case Detail::Number:
+        detail = std::to_string(number);
         break;
     }
-    return text + ")";
+    const char *const separator = path.empty() || detail.empty() ? "" : ", ";
+    return std::string(form.name) + "(" + path + separator + detail + ")";
+}
+
+std::string CallInfo::Name() const {
+    return kForms[Index(call)].name;
 }
 
 void Fault::Fail(Call call, int error, int nth) {
@@ -172,6 +194,13 @@ void Fault::Quiet(Call call) {
 
 void Fault::On(Call call, Hook hook) {
     SetHook(call, std::move(hook));
+}
+
+void Fault::Before(Call call, std::function<void(CallInfo &)> action) {
+    SetHook(call, [action = std::move(action)](CallInfo &info) {
+        action(info);
+        return std::optional<long>();
+    });
 }
 
 void Fault::Record(Call call) {
@@ -228,15 +257,42 @@ CallInfo OfPathAt(Call call, int directory, const char *path, long number = 0) {
     return info;
 }
 
+CallInfo OfFd(Call call, int fd, long number = 0, std::size_t size = 0,
+              const void *data = nullptr) {
+    CallInfo info{call, {}, {}};
+    info.fd = fd;
+    info.number = number;
+    info.size = size;
+    info.data = data;
+    return info;
+}
+
+CallInfo OfRename(const char *from, const char *to) {
+    CallInfo info = OfPath(Call::Rename, from);
+    info.otherPath = to;
+    return info;
+}
+
+CallInfo OfConnect(int fd, const sockaddr *address, socklen_t length) {
+    CallInfo info = OfFd(Call::Connect, fd, static_cast<long>(length));
+    if (address != nullptr && address->sa_family == AF_UNIX) {
+        info.path = reinterpret_cast<const sockaddr_un *>(address)->sun_path;
+        info.data = address;
+    }
+    return info;
+}
+
 Call KindOfOpen(int flags) {
     return (flags & O_PATH) != 0 ? Call::OpenPath : Call::Open;
 }
 
-CallInfo OfFd(Call call, int fd, long number = 0) {
-    CallInfo info{call, {}, {}};
-    info.fd = fd;
-    info.number = number;
-    return info;
+Call KindOfStat(int flags) {
+    return (flags & AT_SYMLINK_NOFOLLOW) != 0 ? Call::Lstat : Call::Stat;
+}
+
+// The mode that an open has only when it may make a file.
+mode_t ModeOfOpen(int flags, va_list arguments) {
+    return (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
 }
 
 // Before a call that others can see: what happened earlier is to stand earlier in the trace.
@@ -250,365 +306,150 @@ void PollBefore() {
 
 } // namespace VANO::TESTS
 
-using VANO::TESTS::Call;
-using VANO::TESTS::CallInfo;
-using VANO::TESTS::Enter;
-using VANO::TESTS::IsActive;
-using VANO::TESTS::KindOfOpen;
-using VANO::TESTS::Next;
-using VANO::TESTS::OfFd;
-using VANO::TESTS::OfPath;
-using VANO::TESTS::OfPathAt;
-using VANO::TESTS::PollBefore;
+using namespace VANO::TESTS;
 
-// Tells a hook of the call; `return` with its result when it has one.
-#define FILEINDEX_TELL(call, description, type)                                                    \
-    if (IsActive(call)) {                                                                          \
+// Tells a hook of a call; `return` with its result when it has one, otherwise does what follows.
+#define FILEINDEX_TELL(type, kind, description, ...)                                               \
+    if (IsActive(kind)) {                                                                          \
         CallInfo told = description;                                                               \
         if (const auto result = Enter(told)) {                                                     \
             return static_cast<type>(*result);                                                     \
         }                                                                                          \
+        __VA_ARGS__;                                                                               \
     }
+
+// A function as the C library's headers have it. `call` makes the call by `next`, the C library's.
+#define FILEINDEX_FUNCTION(type, name, parameters, kind, description, call)                        \
+    type name parameters {                                                                         \
+        static const auto next = Next<decltype(&::name)>(#name);                                   \
+        FILEINDEX_TELL(type, kind, description)                                                    \
+        return call;                                                                               \
+    }
+
+#define FILEINDEX_OPEN(name, parameters, description, ...)                                         \
+    int name parameters {                                                                          \
+        static const auto next = Next<decltype(&::name)>(#name);                                   \
+        va_list arguments;                                                                         \
+        va_start(arguments, flags);                                                                \
+        const mode_t mode = ModeOfOpen(flags, arguments);                                          \
+        va_end(arguments);                                                                         \
+        FILEINDEX_TELL(int, KindOfOpen(flags), description)                                        \
+        return next(__VA_ARGS__, flags, mode);                                                     \
+    }
+
+// The calls that there are twice: with offsets of the usual width, and of 64 bits.
+#define FILEINDEX_FILE_CALLS(bits, offset_type)                                                    \
+    FILEINDEX_OPEN(open##bits, (const char *path, int flags, ...),                                 \
+                   OfPath(KindOfOpen(flags), path, flags), path)                                   \
+    FILEINDEX_OPEN(openat##bits, (int directory, const char *path, int flags, ...),                \
+                   OfPathAt(KindOfOpen(flags), directory, path, flags), directory, path)           \
+    FILEINDEX_FUNCTION(int, mkostemp##bits, (char *path, int flags), Call::Mkostemp,               \
+                       OfPath(Call::Mkostemp, path, flags), next(path, flags))                     \
+    FILEINDEX_FUNCTION(int, ftruncate##bits, (int fd, offset_type length)__THROW, Call::Ftruncate, \
+                       OfFd(Call::Ftruncate, fd, length), next(fd, length))                        \
+    FILEINDEX_FUNCTION(                                                                            \
+        int, fallocate##bits, (int fd, int mode, offset_type offset, offset_type length),          \
+        Call::Fallocate, OfFd(Call::Fallocate, fd, length), next(fd, mode, offset, length))        \
+    FILEINDEX_FUNCTION(int, stat##bits, (const char *path, struct stat##bits *out)__THROW,         \
+                       Call::Stat, OfPath(Call::Stat, path), next(path, out))                      \
+    FILEINDEX_FUNCTION(int, lstat##bits, (const char *path, struct stat##bits *out)__THROW,        \
+                       Call::Lstat, OfPath(Call::Lstat, path), next(path, out))                    \
+    FILEINDEX_FUNCTION(int, fstat##bits, (int fd, struct stat##bits *out)__THROW, Call::Fstat,     \
+                       OfFd(Call::Fstat, fd), next(fd, out))                                       \
+    FILEINDEX_FUNCTION(                                                                            \
+        int, fstatat##bits,                                                                        \
+        (int directory, const char *path, struct stat##bits *out, int flags)__THROW,               \
+        KindOfStat(flags), OfPathAt(KindOfStat(flags), directory, path),                           \
+        next(directory, path, out, flags))
 
 #pragma GCC visibility push(default)
 extern "C" {
 
-int open(const char *path, int flags, ...) {
-    static const auto next = Next<int (*)(const char *, int, ...)>("open");
-    va_list arguments;
-    va_start(arguments, flags);
-    const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
-    va_end(arguments);
-    const Call kind = KindOfOpen(flags);
-    FILEINDEX_TELL(kind, OfPath(kind, path, flags), int)
-    return next(path, flags, mode);
-}
+FILEINDEX_FILE_CALLS(, off_t)
+FILEINDEX_FILE_CALLS(64, off64_t)
 
-int open64(const char *path, int flags, ...) {
-    static const auto next = Next<int (*)(const char *, int, ...)>("open64");
-    va_list arguments;
-    va_start(arguments, flags);
-    const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
-    va_end(arguments);
-    const Call kind = KindOfOpen(flags);
-    FILEINDEX_TELL(kind, OfPath(kind, path, flags), int)
-    return next(path, flags, mode);
-}
-
-int openat64(int directory, const char *path, int flags, ...) {
-    static const auto next = Next<int (*)(int, const char *, int, ...)>("openat64");
-    va_list arguments;
-    va_start(arguments, flags);
-    const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
-    va_end(arguments);
-    const Call kind = KindOfOpen(flags);
-    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path, flags), int)
-    return next(directory, path, flags, mode);
-}
-
-int openat(int directory, const char *path, int flags, ...) {
-    static const auto next = Next<int (*)(int, const char *, int, ...)>("openat");
-    va_list arguments;
-    va_start(arguments, flags);
-    const mode_t mode = (flags & (O_CREAT | O_TMPFILE)) != 0 ? va_arg(arguments, mode_t) : 0;
-    va_end(arguments);
-    const Call kind = KindOfOpen(flags);
-    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path, flags), int)
-    return next(directory, path, flags, mode);
-}
-
-int close(int fd) {
-    static const auto next = Next<int (*)(int)>("close");
-    FILEINDEX_TELL(Call::Close, OfFd(Call::Close, fd), int)
-    return next(fd);
-}
+FILEINDEX_FUNCTION(int, close, (int fd), Call::Close, OfFd(Call::Close, fd), next(fd))
+FILEINDEX_FUNCTION(int, fsync, (int fd), Call::Fsync, OfFd(Call::Fsync, fd), next(fd))
+FILEINDEX_FUNCTION(int, flock, (int fd, int operation)__THROW, Call::Flock,
+                   OfFd(Call::Flock, fd, operation), next(fd, operation))
+FILEINDEX_FUNCTION(int, chmod, (const char *path, mode_t mode)__THROW, Call::Chmod,
+                   OfPath(Call::Chmod, path, mode), next(path, mode))
+FILEINDEX_FUNCTION(int, fchmod, (int fd, mode_t mode)__THROW, Call::Fchmod,
+                   OfFd(Call::Fchmod, fd, mode), next(fd, mode))
+FILEINDEX_FUNCTION(int, fchown, (int fd, uid_t owner, gid_t group)__THROW, Call::Fchown,
+                   OfFd(Call::Fchown, fd, owner), next(fd, owner, group))
+FILEINDEX_FUNCTION(int, mkdir, (const char *path, mode_t mode)__THROW, Call::Mkdir,
+                   OfPath(Call::Mkdir, path, mode), next(path, mode))
+FILEINDEX_FUNCTION(int, mkdirat, (int directory, const char *path, mode_t mode)__THROW, Call::Mkdir,
+                   OfPathAt(Call::Mkdir, directory, path, mode), next(directory, path, mode))
+FILEINDEX_FUNCTION(int, unlink, (const char *path)__THROW, Call::Unlink, OfPath(Call::Unlink, path),
+                   next(path))
+FILEINDEX_FUNCTION(int, rename, (const char *from, const char *to)__THROW, Call::Rename,
+                   OfRename(from, to), (PollBefore(), next(from, to)))
+FILEINDEX_FUNCTION(int, socket, (int domain, int kind, int protocol)__THROW, Call::Socket,
+                   OfPath(Call::Socket, "", kind), next(domain, kind, protocol))
+FILEINDEX_FUNCTION(int, connect, (int fd, const sockaddr *address, socklen_t length), Call::Connect,
+                   OfConnect(fd, address, length), (PollBefore(), next(fd, address, length)))
+FILEINDEX_FUNCTION(int, setsockopt,
+                   (int fd, int level, int name, const void *value, socklen_t length)__THROW,
+                   Call::Setsockopt, OfFd(Call::Setsockopt, fd, name, length, value),
+                   next(fd, level, name, value, length))
+FILEINDEX_FUNCTION(int, usleep, (useconds_t microseconds), Call::Usleep,
+                   OfPath(Call::Usleep, "", static_cast<long>(microseconds)), next(microseconds))
+FILEINDEX_FUNCTION(int, rand, () __THROW, Call::Rand, OfPath(Call::Rand, ""), next())
 
 ssize_t read(int fd, void *buffer, size_t size) {
-    static const auto next = Next<ssize_t (*)(int, void *, size_t)>("read");
-    if (IsActive(Call::Read)) {
-        CallInfo info = OfFd(Call::Read, fd);
-        info.size = size;
-        if (const auto result = Enter(info)) {
-            return *result;
-        }
-        size = info.size;
-    }
+    static const auto next = Next<decltype(&::read)>("read");
+    FILEINDEX_TELL(ssize_t, Call::Read, OfFd(Call::Read, fd, 0, size), size = told.size)
     return next(fd, buffer, size);
 }
 
 ssize_t write(int fd, const void *buffer, size_t size) {
-    static const auto next = Next<ssize_t (*)(int, const void *, size_t)>("write");
-    if (IsActive(Call::Write)) {
-        CallInfo info = OfFd(Call::Write, fd);
-        info.size = size;
-        info.data = buffer;
-        if (const auto result = Enter(info)) {
-            return *result;
-        }
-        size = info.size;
-    }
+    static const auto next = Next<decltype(&::write)>("write");
+    FILEINDEX_TELL(ssize_t, Call::Write, OfFd(Call::Write, fd, 0, size, buffer), size = told.size)
     return next(fd, buffer, size);
 }
 
-int flock(int fd, int operation) __THROW {
-    static const auto next = Next<int (*)(int, int)>("flock");
-    FILEINDEX_TELL(Call::Flock, OfFd(Call::Flock, fd, operation), int)
-    return next(fd, operation);
-}
-
-int fsync(int fd) {
-    static const auto next = Next<int (*)(int)>("fsync");
-    FILEINDEX_TELL(Call::Fsync, OfFd(Call::Fsync, fd), int)
-    return next(fd);
-}
-
-int rename(const char *from, const char *to) __THROW {
-    static const auto next = Next<int (*)(const char *, const char *)>("rename");
-    PollBefore();
-    if (IsActive(Call::Rename)) {
-        CallInfo info = OfPath(Call::Rename, from);
-        info.otherPath = to;
-        if (const auto result = Enter(info)) {
-            return static_cast<int>(*result);
-        }
-    }
-    return next(from, to);
-}
-
-int unlink(const char *path) __THROW {
-    static const auto next = Next<int (*)(const char *)>("unlink");
-    FILEINDEX_TELL(Call::Unlink, OfPath(Call::Unlink, path), int)
-    return next(path);
-}
-
-int chmod(const char *path, mode_t mode) __THROW {
-    static const auto next = Next<int (*)(const char *, mode_t)>("chmod");
-    FILEINDEX_TELL(Call::Chmod, OfPath(Call::Chmod, path, mode), int)
-    return next(path, mode);
-}
-
-int fchmod(int fd, mode_t mode) __THROW {
-    static const auto next = Next<int (*)(int, mode_t)>("fchmod");
-    FILEINDEX_TELL(Call::Fchmod, OfFd(Call::Fchmod, fd, mode), int)
-    return next(fd, mode);
-}
-
-int fchown(int fd, uid_t owner, gid_t group) __THROW {
-    static const auto next = Next<int (*)(int, uid_t, gid_t)>("fchown");
-    FILEINDEX_TELL(Call::Fchown, OfFd(Call::Fchown, fd, owner), int)
-    return next(fd, owner, group);
-}
-
-int mkdir(const char *path, mode_t mode) __THROW {
-    static const auto next = Next<int (*)(const char *, mode_t)>("mkdir");
-    FILEINDEX_TELL(Call::Mkdir, OfPath(Call::Mkdir, path, mode), int)
-    return next(path, mode);
-}
-
-int mkdirat(int directory, const char *path, mode_t mode) __THROW {
-    static const auto next = Next<int (*)(int, const char *, mode_t)>("mkdirat");
-    FILEINDEX_TELL(Call::Mkdir, OfPathAt(Call::Mkdir, directory, path, mode), int)
-    return next(directory, path, mode);
-}
-
-int mkostemp(char *path, int flags) {
-    static const auto next = Next<int (*)(char *, int)>("mkostemp");
-    FILEINDEX_TELL(Call::Mkostemp, OfPath(Call::Mkostemp, path, flags), int)
-    return next(path, flags);
-}
-
-int mkostemp64(char *path, int flags) {
-    static const auto next = Next<int (*)(char *, int)>("mkostemp64");
-    FILEINDEX_TELL(Call::Mkostemp, OfPath(Call::Mkostemp, path, flags), int)
-    return next(path, flags);
-}
-
-int ftruncate(int fd, off_t length) __THROW {
-    static const auto next = Next<int (*)(int, off_t)>("ftruncate");
-    FILEINDEX_TELL(Call::Ftruncate, OfFd(Call::Ftruncate, fd, length), int)
-    return next(fd, length);
-}
-
-int ftruncate64(int fd, off64_t length) __THROW {
-    static const auto next = Next<int (*)(int, off64_t)>("ftruncate64");
-    FILEINDEX_TELL(Call::Ftruncate, OfFd(Call::Ftruncate, fd, length), int)
-    return next(fd, length);
-}
-
-int fallocate(int fd, int mode, off_t offset, off_t length) {
-    static const auto next = Next<int (*)(int, int, off_t, off_t)>("fallocate");
-    FILEINDEX_TELL(Call::Fallocate, OfFd(Call::Fallocate, fd, length), int)
-    return next(fd, mode, offset, length);
-}
-
-int fallocate64(int fd, int mode, off64_t offset, off64_t length) {
-    static const auto next = Next<int (*)(int, int, off64_t, off64_t)>("fallocate64");
-    FILEINDEX_TELL(Call::Fallocate, OfFd(Call::Fallocate, fd, length), int)
-    return next(fd, mode, offset, length);
-}
-
-int stat(const char *path, struct stat *info) __THROW {
-    static const auto next = Next<int (*)(const char *, struct stat *)>("stat");
-    FILEINDEX_TELL(Call::Stat, OfPath(Call::Stat, path), int)
-    return next(path, info);
-}
-
-int stat64(const char *path, struct stat64 *info) __THROW {
-    static const auto next = Next<int (*)(const char *, struct stat64 *)>("stat64");
-    FILEINDEX_TELL(Call::Stat, OfPath(Call::Stat, path), int)
-    return next(path, info);
-}
-
-int lstat(const char *path, struct stat *info) __THROW {
-    static const auto next = Next<int (*)(const char *, struct stat *)>("lstat");
-    FILEINDEX_TELL(Call::Lstat, OfPath(Call::Lstat, path), int)
-    return next(path, info);
-}
-
-int lstat64(const char *path, struct stat64 *info) __THROW {
-    static const auto next = Next<int (*)(const char *, struct stat64 *)>("lstat64");
-    FILEINDEX_TELL(Call::Lstat, OfPath(Call::Lstat, path), int)
-    return next(path, info);
-}
-
-int fstatat64(int directory, const char *path, struct stat64 *info, int flags) __THROW {
-    static const auto next = Next<int (*)(int, const char *, struct stat64 *, int)>("fstatat64");
-    const Call kind = (flags & AT_SYMLINK_NOFOLLOW) != 0 ? Call::Lstat : Call::Stat;
-    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path), int)
-    return next(directory, path, info, flags);
-}
-
-int fstatat(int directory, const char *path, struct stat *info, int flags) __THROW {
-    static const auto next = Next<int (*)(int, const char *, struct stat *, int)>("fstatat");
-    const Call kind = (flags & AT_SYMLINK_NOFOLLOW) != 0 ? Call::Lstat : Call::Stat;
-    FILEINDEX_TELL(kind, OfPathAt(kind, directory, path), int)
-    return next(directory, path, info, flags);
-}
-
-int fstat(int fd, struct stat *info) __THROW {
-    static const auto next = Next<int (*)(int, struct stat *)>("fstat");
-    FILEINDEX_TELL(Call::Fstat, OfFd(Call::Fstat, fd), int)
-    return next(fd, info);
-}
-
-int fstat64(int fd, struct stat64 *info) __THROW {
-    static const auto next = Next<int (*)(int, struct stat64 *)>("fstat64");
-    FILEINDEX_TELL(Call::Fstat, OfFd(Call::Fstat, fd), int)
-    return next(fd, info);
-}
-
 char *realpath(const char *path, char *resolved) __THROW {
-    static const auto next = Next<char *(*)(const char *, char *)>("realpath");
-    if (IsActive(Call::Realpath)) {
-        CallInfo info = OfPath(Call::Realpath, path);
-        if (Enter(info)) {
-            return nullptr;
-        }
-    }
-    return next(path, resolved);
-}
-
-// What a fortified build calls instead of read, realpath, open and openat.
-ssize_t __read_chk(int fd, void *buffer, size_t size, size_t room);
-ssize_t __read_chk(int fd, void *buffer, size_t size, size_t) {
-    return read(fd, buffer, size);
-}
-
-char *__realpath_chk(const char *path, char *resolved, size_t room) __THROW;
-char *__realpath_chk(const char *path, char *resolved, size_t) __THROW {
-    return realpath(path, resolved);
-}
-
-int __open_2(const char *path, int flags);
-int __open_2(const char *path, int flags) {
-    return open(path, flags);
-}
-
-int __open64_2(const char *path, int flags);
-int __open64_2(const char *path, int flags) {
-    return open64(path, flags);
-}
-
-int __openat_2(int directory, const char *path, int flags);
-int __openat_2(int directory, const char *path, int flags) {
-    return openat(directory, path, flags);
-}
-
-int __openat64_2(int directory, const char *path, int flags);
-int __openat64_2(int directory, const char *path, int flags) {
-    return openat64(directory, path, flags);
-}
-
-int socket(int domain, int type, int protocol) __THROW {
-    static const auto next = Next<int (*)(int, int, int)>("socket");
-    FILEINDEX_TELL(Call::Socket, OfPath(Call::Socket, "", type), int)
-    return next(domain, type, protocol);
-}
-
-int connect(int fd, const sockaddr *address, socklen_t length) {
-    static const auto next = Next<int (*)(int, const sockaddr *, socklen_t)>("connect");
-    PollBefore();
-    if (IsActive(Call::Connect)) {
-        CallInfo info = OfFd(Call::Connect, fd, static_cast<long>(length));
-        if (address != nullptr && address->sa_family == AF_UNIX) {
-            info.path = reinterpret_cast<const sockaddr_un *>(address)->sun_path;
-            info.data = address;
-        }
-        if (const auto result = Enter(info)) {
-            return static_cast<int>(*result);
-        }
-    }
-    return next(fd, address, length);
-}
-
-int setsockopt(int fd, int level, int name, const void *value, socklen_t length) __THROW {
-    static const auto next = Next<int (*)(int, int, int, const void *, socklen_t)>("setsockopt");
-    if (IsActive(Call::Setsockopt)) {
-        CallInfo info = OfFd(Call::Setsockopt, fd, name);
-        info.size = length;
-        info.data = value;
-        if (const auto result = Enter(info)) {
-            return static_cast<int>(*result);
-        }
-    }
-    return next(fd, level, name, value, length);
+    static const auto next = Next<decltype(&::realpath)>("realpath");
+    CallInfo info = OfPath(Call::Realpath, path);
+    return IsActive(Call::Realpath) && Enter(info) ? nullptr : next(path, resolved);
 }
 
 sighandler_t signal(int number, sighandler_t handler) __THROW {
-    static const auto next = Next<sighandler_t (*)(int, sighandler_t)>("signal");
-    if (IsActive(Call::Signal)) {
-        CallInfo info = OfPath(Call::Signal, "", number);
-        if (Enter(info)) {
-            return SIG_ERR;
-        }
-    }
-    return next(number, handler);
-}
-
-int usleep(useconds_t microseconds) {
-    static const auto next = Next<int (*)(useconds_t)>("usleep");
-    FILEINDEX_TELL(Call::Usleep, OfPath(Call::Usleep, "", static_cast<long>(microseconds)), int)
-    return next(microseconds);
-}
-
-int rand(void) __THROW {
-    static const auto next = Next<int (*)()>("rand");
-    FILEINDEX_TELL(Call::Rand, OfPath(Call::Rand, ""), int)
-    return next();
+    static const auto next = Next<decltype(&::signal)>("signal");
+    CallInfo info = OfPath(Call::Signal, "", number);
+    return IsActive(Call::Signal) && Enter(info) ? SIG_ERR : next(number, handler);
 }
 
 time_t time(time_t *out) __THROW {
-    static const auto next = Next<time_t (*)(time_t *)>("time");
-    if (IsActive(Call::Time)) {
-        CallInfo info = OfPath(Call::Time, "");
-        if (const auto result = Enter(info)) {
-            if (out != nullptr) {
-                *out = *result;
-            }
-            return *result;
-        }
+    static const auto next = Next<decltype(&::time)>("time");
+    CallInfo info = OfPath(Call::Time, "");
+    const auto result = IsActive(Call::Time) ? Enter(info) : std::nullopt;
+    if (result && out != nullptr) {
+        *out = *result;
     }
-    return next(out);
+    return result ? *result : next(out);
+}
+
+// What a fortified build calls instead of read, realpath, open and openat.
+ssize_t __read_chk(int fd, void *buffer, size_t size, size_t) {
+    return read(fd, buffer, size);
+}
+char *__realpath_chk(const char *path, char *resolved, size_t) __THROW {
+    return realpath(path, resolved);
+}
+int __open_2(const char *path, int flags) {
+    return open(path, flags);
+}
+int __open64_2(const char *path, int flags) {
+    return open64(path, flags);
+}
+int __openat_2(int directory, const char *path, int flags) {
+    return openat(directory, path, flags);
+}
+int __openat64_2(int directory, const char *path, int flags) {
+    return openat64(directory, path, flags);
 }
 
 } // extern "C"

@@ -70,8 +70,9 @@ struct CallInfo {
     std::size_t size = 0;       // read and write; a hook may make it smaller
     const void *data = nullptr; // write's buffer, setsockopt's value, connect's address
 
-    // What a recorded call looks like: "write(/tmp/x, 12)".
+    // What a recorded call looks like: "write(/tmp/x, 12)"; and what stands before its bracket.
     [[nodiscard]] std::string Text() const;
+    [[nodiscard]] std::string Name() const;
 };
 
 class Fault {
@@ -86,6 +87,7 @@ class Fault {
     static void Return(Call call, const std::vector<long> &results);
     static void Quiet(Call call);
     static void On(Call call, Hook hook);
+    static void Before(Call call, std::function<void(CallInfo &)> action); // then the call happens
     static void Record(Call call);
     static void Count(Call call); // only counts, see Calls()
 

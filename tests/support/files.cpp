@@ -1,6 +1,8 @@
 #include "support/files.h"
 
 #include <algorithm>
+#include <cstdio>
+#include <cstdlib>
 #include <fcntl.h>
 #include <filesystem>
 #include <fstream>
@@ -103,6 +105,28 @@ mode_t ModeOf(const std::string &path) {
     struct stat info {};
     EXPECT_EQ(::stat(path.c_str(), &info), 0) << path;
     return info.st_mode & 07777;
+}
+
+std::map<int, std::string> OpenDescriptors() {
+    constexpr char kDescriptors[] = "/proc/self/fd/";
+    const KitScope kit;
+    std::map<int, std::string> open;
+    for (const std::string &name : NamesIn(kDescriptors)) {
+        std::error_code error;
+        const auto target = fs::read_symlink(kDescriptors + name, error);
+        if (!error) { // the descriptor that listed the others is gone
+            open[std::stoi(name)] = target;
+        }
+    }
+    return open;
+}
+
+void RequireSandbox() {
+    if (!Exists("/.fileindex-sandbox")) {
+        (void)std::fputs("This program changes system paths; run it through scripts/sandbox.\n",
+                         stderr);
+        std::_Exit(2);
+    }
 }
 
 HoldLock::HoldLock(const std::string &path, bool exclusive) : fd_(-1) {

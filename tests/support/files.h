@@ -4,6 +4,7 @@
 // Files as tests need them: short, and any failure fails the test on the spot.
 
 #include <json/value.h>
+#include <map>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -34,6 +35,12 @@ bool Exists(const std::string &path);                           // by lstat
 std::vector<std::string> NamesIn(const std::string &directory); // sorted
 
 mode_t ModeOf(const std::string &path); // permission bits
+
+// The descriptors that are open now, with what each stands for.
+std::map<int, std::string> OpenDescriptors();
+
+// Ends the process unless the places that tests change are private here.
+void RequireSandbox();
 
 // An exclusive (or shared) flock on a file from a descriptor of its own, as another process would
 // hold it. The file is created when missing.

@@ -2,27 +2,11 @@
 
 #include <cstdlib>
 #include <fcntl.h>
-#include <filesystem>
 #include <unistd.h>
 
 namespace VANO::TESTS {
 
 namespace {
-
-constexpr char kDescriptors[] = "/proc/self/fd";
-
-std::map<int, std::string> OpenDescriptors() {
-    const KitScope kit;
-    std::map<int, std::string> open;
-    for (const std::string &name : NamesIn(kDescriptors)) {
-        std::error_code error;
-        const auto target = std::filesystem::read_symlink(kDescriptors + ("/" + name), error);
-        if (!error) { // the descriptor that listed the others is gone
-            open[std::stoi(name)] = target;
-        }
-    }
-    return open;
-}
 
 void EmptyDirectory(const std::string &path) {
     MakeDirs(path);

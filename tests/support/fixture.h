@@ -34,11 +34,24 @@
 #include "support/fake_platform.h"
 #include "support/fault.h"
 #include "support/files.h"
+#include "support/sockets.h"
 #include "support/system_log.h"
 
 namespace VANO::TESTS {
 
 using namespace VANO::FILEINDEX;
+using ::testing::AllOf;
+using ::testing::Contains;
+using ::testing::Each;
+using ::testing::ElementsAre;
+using ::testing::ElementsAreArray;
+using ::testing::Field;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using ::testing::SizeIs;
+using ::testing::StartsWith;
+using ::testing::UnorderedElementsAre;
 
 constexpr char kSettingsDirectory[] = "/usr/vano/etc/fileindex";
 constexpr char kFolderFile[] = "/usr/vano/etc/fileindex/folder.conf";
@@ -69,9 +82,9 @@ class LibraryTest : public ::testing::Test {
     void ExpectError(_tag_fileindex_err_ code, const char *file = __builtin_FILE(),
                      int line = __builtin_LINE());
 
-    // The test leaves exactly that many descriptors open, as the library is required to; they are
-    // closed afterwards.
-    void ExpectLeakedDescriptors(int count) { expectedLeaks_ = count; }
+    // The test leaves so many more descriptors open, as the library is required to; they are closed
+    // afterwards.
+    void ExpectLeakedDescriptors(int count) { expectedLeaks_ += count; }
 
     // The test itself puts other files beside the settings files.
     void AllowStrayFiles() { strayFilesAllowed_ = true; }

@@ -15,12 +15,12 @@
 #include <mutex>
 #include <poll.h>
 #include <sys/socket.h>
-#include <sys/un.h>
 #include <syslog.h>
 #include <thread>
 #include <unistd.h>
 
 #include "support/event_trace.h"
+#include "support/sockets.h"
 
 namespace VANO::TESTS {
 
@@ -67,20 +67,8 @@ void Drain() {
     }
 }
 
-[[noreturn]] void GiveUp(const char *what) {
-    std::perror(what);
-    std::_Exit(2);
-}
-
 void Listen() {
-    const int fd = ::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::memcpy(address.sun_path, kLogSocket, sizeof(kLogSocket));
-    ::unlink(kLogSocket);
-    if (fd < 0 || ::bind(fd, reinterpret_cast<sockaddr *>(&address), sizeof(address)) != 0) {
-        GiveUp(kLogSocket);
-    }
+    const int fd = ListenAt(kLogSocket, SOCK_DGRAM);
     const int size = 16 << 20;
     (void)::setsockopt(fd, SOL_SOCKET, SO_RCVBUFFORCE, &size, sizeof(size));
     GetInbox().fd = fd;

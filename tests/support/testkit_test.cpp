@@ -9,7 +9,6 @@
 #include <gtest/gtest-spi.h>
 #include <sys/file.h>
 #include <sys/socket.h>
-#include <sys/un.h>
 #include <syslog.h>
 #include <unistd.h>
 
@@ -21,9 +20,6 @@
 namespace VANO::TESTS {
 
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 // Shows what the teardown of a test would say.
 class KitTest : public LibraryTest {
@@ -262,26 +258,14 @@ TEST_F(TestKitTest, ResultsCanReplaceCalls) {
     EXPECT_EQ(Fault::Log(Call::Usleep).front().number, 999999);
 }
 
-int Connect() {
-    const int fd = ::socket(AF_UNIX, SOCK_STREAM, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::memcpy(address.sun_path, kDaemonSocket, sizeof(kDaemonSocket));
-    if (::connect(fd, reinterpret_cast<sockaddr *>(&address), sizeof(address)) != 0) {
-        ::close(fd);
-        return -1;
-    }
-    return fd;
-}
-
 TEST_F(TestKitTest, WithoutAPeerNobodyListens) {
     { const DaemonPeer daemon; }
-    EXPECT_EQ(Connect(), -1);
+    EXPECT_EQ(ConnectTo(kDaemonSocket), -1);
 }
 
 TEST_F(TestKitTest, ThePeerTellsBrokenCommandsFromWholeOnes) {
     DaemonPeer daemon;
-    const int fd = Connect();
+    const int fd = ConnectTo(kDaemonSocket);
     EXPECT_EQ(::write(fd, "\x05\0\0\0{}", 6), 6);
     EXPECT_FALSE(daemon.Connections().at(0).closed);
     ::close(fd);
@@ -297,19 +281,19 @@ TEST_F(TestKitTest, ThePeerCanReplyCloseOrStall) {
     char buffer[16] = "";
     {
         const DaemonPeer daemon(DaemonPeer::Mode::Reply);
-        const int fd = Connect();
+        const int fd = ConnectTo(kDaemonSocket);
         EXPECT_GT(::read(fd, buffer, sizeof(buffer)), 0);
         ::close(fd);
     }
     {
         const DaemonPeer daemon(DaemonPeer::Mode::CloseAtOnce);
-        const int fd = Connect();
+        const int fd = ConnectTo(kDaemonSocket);
         EXPECT_EQ(::read(fd, buffer, sizeof(buffer)), 0);
         ::close(fd);
     }
     for (const auto mode : {DaemonPeer::Mode::NoAccept, DaemonPeer::Mode::NoRead}) {
         DaemonPeer daemon(mode);
-        const int fd = Connect();
+        const int fd = ConnectTo(kDaemonSocket);
         EXPECT_EQ(::write(fd, "x", 1), 1);
         daemon.Sync();
         EXPECT_EQ(::recv(fd, buffer, sizeof(buffer), MSG_DONTWAIT), -1);

@@ -12,11 +12,11 @@
 #include <set>
 #include <sys/socket.h>
 #include <sys/stat.h>
-#include <sys/un.h>
 #include <thread>
 #include <unistd.h>
 
 #include "support/files.h"
+#include "support/sockets.h"
 #include "system/child.h"
 
 namespace VANO::TESTS {
@@ -64,12 +64,7 @@ std::vector<std::string> Lines() {
 
 class Connection {
   public:
-    Connection() : fd_(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
-        sockaddr_un address{};
-        address.sun_family = AF_UNIX;
-        std::strcpy(address.sun_path, kSocket);
-        EXPECT_EQ(::connect(fd_, reinterpret_cast<const sockaddr *>(&address), sizeof(address)), 0);
-    }
+    Connection() : fd_(ConnectTo(kSocket)) { EXPECT_GE(fd_, 0); }
     ~Connection() { ::close(fd_); }
     Connection(const Connection &) = delete;
     Connection &operator=(const Connection &) = delete;
@@ -85,10 +80,6 @@ class Connection {
 
 std::string Length(std::uint32_t length) {
     return std::string(reinterpret_cast<const char *>(&length), sizeof(length));
-}
-
-std::string Message(const std::string &text) {
-    return Length(static_cast<std::uint32_t>(text.size() + 1)) + text + '\0';
 }
 
 class PeerTest : public ::testing::Test {
@@ -268,7 +259,7 @@ TEST_F(PeerTest, LeavesTheQueuesAloneWhilePaused) {
     StartAndWait();
     std::this_thread::sleep_for(std::chrono::milliseconds(100));
     EXPECT_TRUE(Exists(kQueue));
-    Connection().Send(Message(R"({"data":{},"type":"resume"})"));
+    Connection().Send(CommandBytes(R"({"data":{},"type":"resume"})"));
     EXPECT_TRUE(Eventually([] { return !Events().empty(); }));
     EXPECT_THAT(Lines(), ElementsAre("command resume {}", "event 1 " + Printed(1)));
 }
@@ -323,7 +314,7 @@ TEST_F(PeerTest, LosesNoEventHoweverOftenItIsKilled) {
 TEST_F(PeerTest, PrintsACommand) {
     StartAndWait();
     Connection().Send(
-        Message(R"({"data":{"folder_path":"/photos"},"type":"upsert_folder_setting"})"));
+        CommandBytes(R"({"data":{"folder_path":"/photos"},"type":"upsert_folder_setting"})"));
     EXPECT_TRUE(Eventually([] { return !Lines().empty(); }));
     EXPECT_THAT(Lines(), ElementsAre(R"(command upsert_folder_setting {"folder_path":"/photos"})"));
 }
@@ -331,7 +322,7 @@ TEST_F(PeerTest, PrintsACommand) {
 TEST_F(PeerTest, ReadsACommandThatComesByteByByte) {
     StartAndWait();
     const Connection connection;
-    for (const char byte : Message(R"({"data":{},"type":"resume"})")) {
+    for (const char byte : CommandBytes(R"({"data":{},"type":"resume"})")) {
         connection.Send(std::string(1, byte));
         std::this_thread::sleep_for(std::chrono::milliseconds(1));
     }
@@ -353,7 +344,7 @@ TEST_P(GarbageTest, IsRefusedAndTheNextCommandHeard) {
     StartAndWait();
     Connection().Send(GetParam().bytes);
     EXPECT_TRUE(Eventually([] { return Lines().size() == 1; }));
-    Connection().Send(Message(R"({"data":{},"type":"resume"})"));
+    Connection().Send(CommandBytes(R"({"data":{},"type":"resume"})"));
     EXPECT_TRUE(Eventually([] { return Lines().size() == 2; }));
     EXPECT_THAT(Lines(), ElementsAre(std::string("refused command: ") + GetParam().refusal,
                                      "command resume {}"));
@@ -368,21 +359,22 @@ INSTANTIATE_TEST_SUITE_P(
                       Garbage{"ZeroLength", Length(0), "length 0"},
                       Garbage{"HalfAMessage", Length(100) + "{", "ends after 5 bytes"},
                       Garbage{"NoZeroByte", Length(2) + "{}", "no zero byte at the end"},
-                      Garbage{"NoJson", Message("{"), "no JSON"},
-                      Garbage{"TwoValues", Message("{}{}"), "no JSON"},
-                      Garbage{"ZeroByte", Message(std::string("{}\0{", 4)), "no JSON"},
-                      Garbage{"TooDeep", Message(std::string(5000, '[')), "no JSON"},
-                      Garbage{"NoObject", Message("[]"), "no command"},
-                      Garbage{"NoType", Message(R"({"data":{}})"), "no command"},
-                      Garbage{"TypeIsANumber", Message(R"({"data":{},"type":1})"), "no command"},
-                      Garbage{"NoData", Message(R"({"type":"resume"})"), "no command"}),
+                      Garbage{"NoJson", CommandBytes("{"), "no JSON"},
+                      Garbage{"TwoValues", CommandBytes("{}{}"), "no JSON"},
+                      Garbage{"ZeroByte", CommandBytes(std::string("{}\0{", 4)), "no JSON"},
+                      Garbage{"TooDeep", CommandBytes(std::string(5000, '[')), "no JSON"},
+                      Garbage{"NoObject", CommandBytes("[]"), "no command"},
+                      Garbage{"NoType", CommandBytes(R"({"data":{}})"), "no command"},
+                      Garbage{"TypeIsANumber", CommandBytes(R"({"data":{},"type":1})"),
+                              "no command"},
+                      Garbage{"NoData", CommandBytes(R"({"type":"resume"})"), "no command"}),
     [](const auto &row) { return row.param.what; });
 
 TEST_F(PeerTest, HangingClientsDelayACommandOnly) {
     StartAndWait();
     std::array<Connection, 80> hanging; // more than it serves at a time
     hanging[0].Send(Length(100));
-    Connection().Send(Message(R"({"data":{},"type":"resume"})"));
+    Connection().Send(CommandBytes(R"({"data":{},"type":"resume"})"));
     EXPECT_TRUE(Eventually([] {
         const auto lines = Lines();
         return std::find(lines.begin(), lines.end(), "command resume {}") != lines.end();
@@ -395,7 +387,7 @@ TEST_F(PeerTest, RefusesToStartBesideALivingOne) {
     const Outcome second = RunToEnd({PEER_PATH});
     EXPECT_EQ(second.status, 1);
     EXPECT_THAT(second.error, HasSubstr("another daemon"));
-    Connection().Send(Message(R"({"data":{},"type":"resume"})"));
+    Connection().Send(CommandBytes(R"({"data":{},"type":"resume"})"));
     EXPECT_TRUE(Eventually([] { return !Lines().empty(); }));
 }
 
@@ -427,7 +419,7 @@ TEST_F(PeerTest, TakesThePlaceOfADeadOne) {
     PutFile(kQueue, EventLine(1));
     Start();
     EXPECT_TRUE(Eventually([] { return !Events().empty(); })); // it listens before it works
-    Connection().Send(Message(R"({"data":{},"type":"resume"})"));
+    Connection().Send(CommandBytes(R"({"data":{},"type":"resume"})"));
     EXPECT_TRUE(Eventually([] { return Lines().size() == 2; }));
 }
 

@@ -16,7 +16,7 @@
 #include <unistd.h>
 
 #include "platform/fuse_server.h"
-#include "platform/mounts.h"
+#include "support/mounts.h"
 #include "support/files.h"
 #include "system/child.h"
 #include "tools/ctl.h"

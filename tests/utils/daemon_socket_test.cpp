@@ -19,10 +19,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::Each;
-using ::testing::ElementsAre;
-using ::testing::Field;
-
 // A command whose JSON text has that many bytes.
 Json::Value PaddingFor(std::size_t textBytes) {
     static const std::size_t kBare = std::strlen(R"({"data":"","type":"x"})");
@@ -83,12 +79,8 @@ TEST_F(DaemonSocketTest, SendsLengthTextAndAZeroByte) {
     data["share_name"] = "photos";
     EXPECT_TRUE(SendCammandToDaemon("delete_share_worker", data));
     const std::string text = R"({"data":{"share_name":"photos"},"type":"delete_share_worker"})";
-    const auto length = static_cast<std::uint32_t>(text.size() + 1);
-    std::string expected(sizeof(length), '\0');
-    std::memcpy(expected.data(), &length, sizeof(length));
-    expected += text + '\0';
     ASSERT_EQ(daemon.Connections().size(), 1U);
-    EXPECT_EQ(daemon.Connections()[0].bytes, expected);
+    EXPECT_EQ(daemon.Connections()[0].bytes, CommandBytes(text));
     EXPECT_TRUE(daemon.Connections()[0].closed);
 }
 
@@ -136,12 +128,7 @@ TEST_F(DaemonSocketTest, WhatIsNoListeningSocketFails) {
     EXPECT_FALSE(SendText(100));
     RemoveTree(kDaemonSocket);
     // Left behind by a daemon that died.
-    const int stale = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::strcpy(address.sun_path, kDaemonSocket);
-    ASSERT_EQ(::bind(stale, reinterpret_cast<sockaddr *>(&address), sizeof(address)), 0);
-    ::close(stale);
+    ::close(ListenAt(kDaemonSocket));
     EXPECT_FALSE(SendText(100));
     RemoveTree(kDaemonSocket);
 }
@@ -238,19 +225,12 @@ TEST_F(DaemonSocketTest, AStalledDaemonHoldsAWriteForASecond) {
 }
 
 TEST_F(DaemonSocketTest, ADaemonThatAcceptsNoMoreHoldsTheCallForASecond) {
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::strcpy(address.sun_path, kDaemonSocket);
-    const auto *const name = reinterpret_cast<const sockaddr *>(&address);
-    std::vector<int> sockets = {::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)};
-    ASSERT_EQ(::bind(sockets[0], name, sizeof(address)), 0);
-    ASSERT_EQ(::listen(sockets[0], 0), 0);
-    int connected = 0;
-    while (connected == 0) { // until no more are let in
-        sockets.push_back(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
-        connected = ::connect(sockets.back(), name, sizeof(address));
-    }
+    std::vector<int> sockets = {ListenAt(kDaemonSocket, SOCK_STREAM, 0)};
+    do { // until no more are let in
+        sockets.push_back(ConnectTo(kDaemonSocket, SOCK_NONBLOCK));
+    } while (sockets.back() >= 0);
     ASSERT_EQ(errno, EAGAIN);
+    sockets.pop_back();
     const auto start = std::chrono::steady_clock::now();
     EXPECT_FALSE(SendText(100));
     const auto held = std::chrono::steady_clock::now() - start;
@@ -278,10 +258,7 @@ TEST_F(DaemonSocketTest, SigpipeIsIgnoredFromTheFirstCallOn) {
 
 TEST_F(DaemonSocketTest, ADaemonThatHangsUpFailsTheCall) {
     DaemonPeer daemon(DaemonPeer::Mode::CloseAtOnce);
-    Fault::On(Call::Write, [&](CallInfo &) -> std::optional<long> {
-        daemon.Sync(); // it has hung up now
-        return std::nullopt;
-    });
+    Fault::Before(Call::Write, [&](CallInfo &) { daemon.Sync(); }); // it has hung up now
     EXPECT_FALSE(SendText(100));
     EXPECT_EQ(Fault::Calls(Call::Write), 1U);
 }

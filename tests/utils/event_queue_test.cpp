@@ -14,17 +14,12 @@
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
-#include <sys/un.h>
 #include <thread>
 #include <unistd.h>
 
 namespace VANO::TESTS {
 
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::StartsWith;
 
 constexpr char kTrip[] = "/volume1/photos/trip";
 constexpr char kQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";
@@ -681,11 +676,7 @@ TEST_F(EventQueueTest, OnlyARegularFileIsWrittenTo) {
     ExpectMark("photos");
     RemoveTree(kStatusFile);
     RemoveTree(kQueue);
-    const int socket = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::snprintf(address.sun_path, sizeof(address.sun_path), "%s", kQueue);
-    ASSERT_EQ(::bind(socket, reinterpret_cast<sockaddr *>(&address), sizeof(address)), 0);
+    const int socket = ListenAt(kQueue);
     EXPECT_FALSE(AddTrip()) << "a socket";
     ::close(socket);
     ExpectMark("photos");

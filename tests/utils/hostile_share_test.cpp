@@ -22,13 +22,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-using ::testing::AllOf;
-using ::testing::Contains;
-using ::testing::Each;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using ::testing::Not;
-
 constexpr char kShare[] = "/volume1/photos";
 constexpr char kMetadataDir[] = "/volume1/photos/@eaDir";
 constexpr char kQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";

@@ -14,9 +14,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 struct Entry {
     const char *name; // of the function
     int (*get)(const char *, char *, int);

@@ -13,9 +13,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 constexpr char kPhotos[] = "/volume1/photos";
 constexpr int kRefusedType = 12;
 

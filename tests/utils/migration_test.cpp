@@ -7,9 +7,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
-
 const Json::Value kNoData;
 
 const std::vector<std::string> kStored = {"/photos/a", "/photos/b", "/video/c"};

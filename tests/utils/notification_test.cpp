@@ -8,8 +8,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-
 class NotificationTest : public LibraryTest {};
 
 TEST_F(NotificationTest, RunsTheToolOnceAndWaitsForIt) {

@@ -10,9 +10,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 class SharePathTest : public LibraryTest {};
 
 // --- share name of a share path ---
