@@ -117,7 +117,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     }
     Run run;
     if (!input.conf.empty()) {
-        Put(kFolderConf, input.conf);
+        PutFile(kFolderConf, input.conf);
     }
     const std::string before = State();
     const Outcome outcome = RunTool(input.arguments);

@@ -149,7 +149,7 @@ void CheckAddingAndDeleting(Folders &settings) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
     const Run run;
     const std::string text(reinterpret_cast<const char *>(data), size);
-    Put(kFolderConf, text);
+    PutFile(kFolderConf, text);
     const auto conf = Parse(text);
     Folders settings;
     const bool loaded = settings.Load();

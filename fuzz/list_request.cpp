@@ -137,9 +137,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     }
     const Run run;
     const Json::Value &conf = (*input)["folders"];
-    Put(kFolderConf, Text(conf));
+    PutFile(kFolderConf, Text(conf));
     if ((*input)["queue"].isString()) {
-        Put(QueueOf("photos"), (*input)["queue"].asString());
+        PutFile(QueueOf("photos"), (*input)["queue"].asString());
     }
     CheckListing({NumberOf((*input)["offset"]), NumberOf((*input)["limit"]),
                   StringOf((*input)["sort_by"]), StringOf((*input)["sort_direction"]),

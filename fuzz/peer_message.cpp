@@ -8,7 +8,6 @@
 #include <json/reader.h>
 #include <memory>
 #include <sys/socket.h>
-#include <sys/un.h>
 #include <unistd.h>
 
 #include "base/unique_fd.h"
@@ -18,12 +17,15 @@
 #include "support/check.h"
 #include "support/json_grammar.h"
 #include "support/naive.h"
+#include "support/sockets.h"
 #include "support/world.h"
 
 namespace {
 
 using namespace VANO::FUZZ;
 using VANO::FILEINDEX::UniqueFd;
+using VANO::TESTS::CommandBytes;
+using VANO::TESTS::ConnectTo;
 
 constexpr char kSocket[] = "/var/run/fileindexd.sock";
 constexpr std::size_t kLengthBytes = sizeof(std::uint32_t);
@@ -104,22 +106,11 @@ Peer &ThePeer() {
 }
 
 void Send(const std::string &bytes) {
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::memcpy(address.sun_path, kSocket, sizeof(kSocket));
-    const UniqueFd connection(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
-    Check(::connect(connection.Get(), reinterpret_cast<const sockaddr *>(&address),
-                    sizeof(address)) == 0,
-          "the peer listens");
+    const UniqueFd connection(ConnectTo(kSocket));
+    Check(static_cast<bool>(connection), "the peer listens");
     Check(bytes.empty() || ::send(connection.Get(), bytes.data(), bytes.size(), MSG_NOSIGNAL) ==
                                static_cast<ssize_t>(bytes.size()),
           "a message fits the socket");
-}
-
-std::string Framed(const std::string &text) {
-    const auto length = static_cast<std::uint32_t>(text.size() + 1);
-    std::string bytes(reinterpret_cast<const char *>(&length), kLengthBytes);
-    return bytes + text + '\0';
 }
 
 bool IsSame(const std::optional<Command> &a, const std::optional<Command> &b) {
@@ -150,13 +141,13 @@ extern "C" std::size_t LLVMFuzzerCustomMutator(std::uint8_t *data, std::size_t s
         mutated = JsonGrammar::MutateBytes(bytes, maxSize);
     } else {
         std::string text = bytes.substr(kLengthBytes, bytes.size() - kLengthBytes - 1);
-        mutated = Framed(grammar.Mutate(text, maxSize - kLengthBytes - 1));
+        mutated = CommandBytes(grammar.Mutate(text, maxSize - kLengthBytes - 1));
     }
     return static_cast<std::size_t>(std::copy(mutated.begin(), mutated.end(), data) - data);
 }
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
-    RequireSandbox();
+    VANO::TESTS::RequireSandbox();
     Peer &peer = ThePeer();
     const Descriptors descriptors;
     const std::string bytes(reinterpret_cast<const char *>(data), size);

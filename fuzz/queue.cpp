@@ -45,10 +45,10 @@ void PutQueues(const Queues &queues) {
     (void)::unlink(path.c_str());
     (void)::unlink((path + ".tmp").c_str());
     if (!queues.waiting.empty()) {
-        Put(path, queues.waiting);
+        PutFile(path, queues.waiting);
     }
     if (!queues.taken.empty()) {
-        Put(path + ".tmp", queues.taken);
+        PutFile(path + ".tmp", queues.taken);
     }
 }
 

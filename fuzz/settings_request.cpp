@@ -213,7 +213,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     Run run;
     const Json::Value &conf = (*input)["folders"];
     if (conf.isObject()) {
-        Put(kFolderConf, Text(conf));
+        PutFile(kFolderConf, Text(conf));
     }
     Model model(conf.isObject() ? conf : Json::Value());
     const Json::Value &steps = (*input)["steps"];

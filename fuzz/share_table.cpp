@@ -16,9 +16,9 @@
 #include "platform/linux/share_table.h"
 #include "platform/vano_platform.h"
 #include "support/check.h"
+#include "support/descriptors.h"
 #include "support/log_tap.h"
 #include "support/naive.h"
-#include "support/sandbox.h"
 
 namespace {
 
@@ -154,7 +154,7 @@ void CheckOrder(std::vector<std::string> names) {
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
-    RequireSandbox();
+    VANO::TESTS::RequireSandbox();
     const Descriptors descriptors;
     const std::string text(reinterpret_cast<const char *>(data), size);
     (void)std::remove(kTable);

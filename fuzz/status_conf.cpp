@@ -59,7 +59,7 @@ void CheckMarks(const Json::Value &conf) {
 // Runs a writer on the file `text`. What it left when it succeeded, none when it failed or the JSON
 // library threw.
 std::optional<Json::Value> Write(const std::string &text, const std::function<bool()> &writer) {
-    Put(kStatusConf, text);
+    PutFile(kStatusConf, text);
     bool written = false;
     try {
         written = writer();
@@ -141,7 +141,7 @@ void CheckUpdated(const std::string &text, const Json::Value &conf) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
     Run run;
     const std::string text(reinterpret_cast<const char *>(data), size);
-    Put(kStatusConf, text);
+    PutFile(kStatusConf, text);
     const auto conf = Parse(text);
     if (!conf) {
         long long time = 4711;

@@ -1,15 +1,10 @@
 #include "support/world.h"
 
 #include <algorithm>
-#include <array>
 #include <cstdint>
 #include <cstring>
-#include <dirent.h>
-#include <fcntl.h>
-#include <memory>
-#include <sys/file.h>
+#include <gtest/gtest.h>
 #include <sys/socket.h>
-#include <sys/un.h>
 #include <unistd.h>
 
 #include <fileindex/config.h>
@@ -22,6 +17,7 @@
 #include "support/files.h"
 #include "support/log_tap.h"
 #include "support/naive.h"
+#include "support/sockets.h"
 
 namespace VANO::FUZZ {
 
@@ -35,23 +31,11 @@ constexpr char kSocket[] = "/var/run/fileindexd.sock";
 constexpr int kBacklog = 4096;
 constexpr const char *kLocks[] = {"/tmp/fileidx_cfg_folder.lock", "/tmp/fileidx_cfg_status.lock"};
 
-UniqueFd Listen() {
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::memcpy(address.sun_path, kSocket, sizeof(kSocket));
-    (void)::unlink(kSocket);
-    UniqueFd listener(::socket(AF_UNIX, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0));
-    Check(::bind(listener.Get(), reinterpret_cast<const sockaddr *>(&address), sizeof(address)) ==
-                  0 &&
-              ::listen(listener.Get(), kBacklog) == 0,
-          "the daemon's socket can be made");
-    return listener;
-}
-
 // Made once, with the first input.
 struct World {
     World() {
-        RequireSandbox();
+        GTEST_FLAG_SET(throw_on_failure, true); // in the kit, too, whatever fails ends the process
+        TESTS::RequireSandbox();
         FakePlatform &platform = FakePlatform::Get();
         platform.Reset();
         for (const std::string &share : ShareNames()) {
@@ -62,10 +46,9 @@ struct World {
             TESTS::MakeDirs("/volume1/" + share + "/@eaDir");
         }
         TESTS::MakeDirs(kSettingsDirectory);
-        listener = Listen();
     }
 
-    UniqueFd listener;
+    int listener = TESTS::ListenAt(kSocket, SOCK_STREAM | SOCK_NONBLOCK, kBacklog);
 };
 
 World &TheWorld() {
@@ -76,16 +59,6 @@ World &TheWorld() {
 Descriptors DescriptorsOfTheWorld() {
     (void)TheWorld();
     return {};
-}
-
-std::string ReadToEnd(const UniqueFd &connection) {
-    std::string text;
-    std::array<char, 4096> buffer;
-    ssize_t got = 0;
-    while ((got = ::read(connection.Get(), buffer.data(), buffer.size())) > 0) {
-        text.append(buffer.data(), static_cast<std::size_t>(got));
-    }
-    return text;
 }
 
 Json::Value CommandIn(const std::string &message) {
@@ -106,20 +79,6 @@ Json::Value CommandIn(const std::string &message) {
               (*command)["type"].isString(),
           "a command is an object with a type and data", text);
     return *command;
-}
-
-bool IsLocked(const char *path) {
-    const UniqueFd file(::open(path, O_RDWR | O_CLOEXEC));
-    return file && ::flock(file.Get(), LOCK_EX | LOCK_NB) != 0;
-}
-
-void CheckNoStrayFile() {
-    const std::unique_ptr<DIR, int (*)(DIR *)> directory(::opendir(kSettingsDirectory), ::closedir);
-    while (const dirent *entry = ::readdir(directory.get())) {
-        const std::string name = entry->d_name;
-        Check(name[0] == '.' || name == "folder.conf" || name == "status.conf",
-              "no other file is left beside the settings", name);
-    }
 }
 
 } // namespace
@@ -154,32 +113,28 @@ Run::~Run() {
     Check(FakePlatform::Get().LiveRecords() == 0, "every share record is released");
     Check(FakePlatform::Get().Violations().empty(), "the platform is called as it wants to be");
     for (const char *lock : kLocks) {
-        Check(!IsLocked(lock), "every lock is released", lock);
+        Check(!TESTS::IsLocked(lock), "every lock is released", lock);
     }
-    CheckNoStrayFile();
+    for (const std::string &name : TESTS::NamesIn(kSettingsDirectory)) {
+        Check(name == "folder.conf" || name == "status.conf",
+              "no other file is left beside the settings", name);
+    }
 }
 
 std::vector<Json::Value> Run::Commands() {
     std::vector<Json::Value> commands;
     for (;;) {
         const UniqueFd connection(
-            ::accept4(TheWorld().listener.Get(), nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC));
+            ::accept4(TheWorld().listener, nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC));
         if (!connection) {
             return commands;
         }
-        commands.push_back(CommandIn(ReadToEnd(connection)));
+        commands.push_back(CommandIn(TESTS::ReadToEnd(connection.Get())));
     }
 }
 
-void Put(const std::string &path, const std::string &text) {
-    const UniqueFd file(::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0644));
-    Check(::write(file.Get(), text.data(), text.size()) == static_cast<ssize_t>(text.size()),
-          "the world's files can be written", path);
-}
-
 std::string Get(const std::string &path) {
-    const UniqueFd file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
-    return file ? ReadToEnd(file) : std::string();
+    return TESTS::ReadIfThere(path).value_or("");
 }
 
 } // namespace VANO::FUZZ

@@ -8,7 +8,8 @@
 #include <string>
 #include <vector>
 
-#include "support/sandbox.h"
+#include "support/descriptors.h"
+#include "support/files.h"
 
 namespace VANO::FUZZ {
 
@@ -37,7 +38,7 @@ class Run {
     Descriptors descriptors_;
 };
 
-void Put(const std::string &path, const std::string &text);
+using TESTS::PutFile;
 // The content; "" for a file that is not there.
 std::string Get(const std::string &path);
 

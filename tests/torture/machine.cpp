@@ -1,17 +1,9 @@
 #include "machine.h"
 
-#include <array>
 #include <csignal>
-#include <cstring>
-#include <dirent.h>
-#include <fcntl.h>
 #include <stdexcept>
 #include <sys/mount.h>
-#include <sys/prctl.h>
-#include <sys/socket.h>
 #include <sys/stat.h>
-#include <sys/un.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include "support/files.h"
@@ -28,51 +20,12 @@ using namespace TESTS;
 constexpr char kSwitch[] = "/run/torture.spotlight";
 constexpr char kDaemonSocket[] = "/run/fileindexd.sock";
 constexpr char kLogSocket[] = "/dev/log";
+constexpr char kNowhere[] = "/dev/null";
 
 void CoverProgram(const char *program, const std::string &standIn) {
     if (::mount(standIn.c_str(), program, nullptr, MS_BIND, nullptr) != 0) {
         throw std::runtime_error(std::string("cannot cover ") + program);
     }
-}
-
-int Bind(const char *path, int type) {
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::strcpy(address.sun_path, path);
-    const int fd = ::socket(AF_UNIX, type | SOCK_CLOEXEC, 0);
-    (void)::unlink(path);
-    if (fd < 0 || ::bind(fd, reinterpret_cast<const sockaddr *>(&address), sizeof(address)) != 0) {
-        throw std::runtime_error(std::string("cannot bind ") + path);
-    }
-    return fd;
-}
-
-// Takes what is sent, and forgets it.
-[[noreturn]] void ReadLog(int log) {
-    std::array<char, std::size_t{256} * 1024> buffer;
-    for (;;) {
-        (void)::recv(log, buffer.data(), buffer.size(), 0);
-    }
-}
-
-[[noreturn]] void ReadCommands(int daemon) {
-    std::array<char, 4096> buffer;
-    for (;;) {
-        const int connection = ::accept(daemon, nullptr, nullptr);
-        while (connection >= 0 && ::read(connection, buffer.data(), buffer.size()) > 0) {
-        }
-        (void)::close(connection);
-    }
-}
-
-pid_t Play(void (*part)(int), int socket) {
-    const pid_t pid = ::fork();
-    if (pid == 0) {
-        ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-        part(socket);
-    }
-    (void)::close(socket);
-    return pid;
 }
 
 void PutScript(const std::string &path) {
@@ -127,33 +80,34 @@ Machine::Machine(const std::string &standIn, bool hasDaemon) {
     CoverProgram("/usr/vano/bin/vanozemnotify", standIn);
     PutScript("/etc/init.d/fileindexd");
     PutScript("/etc/init.d/smbd");
-    std::string table;
+    Json::Value table;
     for (const Share &share : kShares) {
-        table += (table.empty() ? "{\"" : ",\"") + std::string(share.name) + "\":\"" +
-                 share.directory + "\"";
+        table[share.name] = share.directory;
         for (const char *folder : {"/2016", "/2017", "/films", "/@eaDir"}) {
             MakeDirs(share.directory + std::string(folder));
         }
     }
-    PutFile("/usr/vano/etc/shares.json", table + "}");
+    PutFile("/usr/vano/etc/shares.json", CompactText(table));
     PutFile(kFolderLock, "");
     PutFile(kStatusLock, "");
-
-    others_.push_back(Play(ReadLog, Bind(kLogSocket, SOCK_DGRAM)));
+    Start({LOG_LISTENER_PATH}, kLogSocket);
     if (hasDaemon) {
-        const int daemon = Bind(kDaemonSocket, SOCK_STREAM);
-        (void)::listen(daemon, 1000);
-        others_.push_back(Play(ReadCommands, daemon));
+        Start({PEER_PATH, "--queue", "/tmp/none"}, kDaemonSocket); // leaves the queues alone
+    }
+}
+
+void Machine::Start(const std::vector<std::string> &program, const char *socket) {
+    others_.push_back(std::make_unique<Child>(program, kNowhere, kNowhere));
+    if (!Eventually([socket] { return Exists(socket); })) {
+        throw std::runtime_error("nobody listens at " + std::string(socket));
     }
 }
 
 Machine::~Machine() {
-    for (const pid_t pid : others_) {
-        (void)::kill(pid, SIGKILL);
-        (void)::waitpid(pid, nullptr, 0);
+    for (const auto &other : others_) {
+        other->Signal(SIGTERM);
+        (void)other->Wait();
     }
-    (void)::unlink(kDaemonSocket);
-    (void)::unlink(kLogSocket);
 }
 
 void Machine::Reset(const Start &start) {

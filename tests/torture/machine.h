@@ -5,10 +5,12 @@
 // that hold events already, a daemon that listens, a system log, and stand-ins for the programs.
 
 #include <map>
+#include <memory>
 #include <optional>
 #include <string>
-#include <sys/types.h>
 #include <vector>
+
+#include "system/child.h"
 
 namespace VANO::TORTURE {
 
@@ -53,7 +55,9 @@ class Machine {
     static Snapshot Look();
 
   private:
-    std::vector<pid_t> others_; // the daemon and the system log
+    void Start(const std::vector<std::string> &program, const char *socket);
+
+    std::vector<std::unique_ptr<TESTS::Child>> others_; // the system log and the daemon
 };
 
 // The events of each share's queue at the start.

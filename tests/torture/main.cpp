@@ -4,10 +4,10 @@
 #include <array>
 #include <gtest/gtest.h>
 #include <iostream>
-#include <unistd.h>
 
 #include "machine.h"
 #include "parts.h"
+#include "support/files.h"
 #include "tracer.h"
 
 namespace {
@@ -41,10 +41,7 @@ int Skip(const char *reason) {
 }
 
 int Run(const std::vector<const Part *> &parts, const Options &options) {
-    if (::access("/.fileindex-sandbox", F_OK) != 0) {
-        std::cerr << "torture: this changes system paths; run it through scripts/sandbox\n";
-        return 2;
-    }
+    VANO::TESTS::RequireSandbox();
     long failures = 0;
     for (const Part *part : parts) {
         if (part->traces && !CanTrace()) {
