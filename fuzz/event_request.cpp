@@ -149,7 +149,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
         return 0; // no request
     }
     Run run;
-    PutFile(kFolderConf, Text((*input)["folders"]));
+    PutFile(kFolderFile, Text((*input)["folders"]));
     const Json::Value &steps = (*input)["steps"];
     for (Json::ArrayIndex i = 0; i < std::min(steps.size(), kMostSteps); ++i) {
         if (steps[i].isObject()) {

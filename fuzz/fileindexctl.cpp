@@ -101,7 +101,7 @@ bool HasOption(const std::vector<std::string> &arguments, const std::string &opt
 
 // All that can be seen from outside.
 std::string State() {
-    std::string state = Get(kFolderConf) + "\n" + Get(kStatusConf);
+    std::string state = Get(kFolderFile) + "\n" + Get(kStatusFile);
     for (const std::string &share : ShareNames()) {
         state += "\n" + Get(QueueOf(share));
     }
@@ -117,7 +117,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     }
     Run run;
     if (!input.conf.empty()) {
-        PutFile(kFolderConf, input.conf);
+        PutFile(kFolderFile, input.conf);
     }
     const std::string before = State();
     const Outcome outcome = RunTool(input.arguments);

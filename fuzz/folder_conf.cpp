@@ -50,7 +50,7 @@ void CheckRefused(const std::string &text, bool isJson) {
     Check(ErrorHandler::GetError() == (isJson ? FILEINDEX_ERR_MALFORMED : FILEINDEX_ERR_LOAD),
           "a refused file sets the error of its kind", text);
     Check(LogTap::Take().size() == 1, "a refused file is logged with one line", text);
-    Check(Get(kFolderConf) == text, "a refused file is left alone", text);
+    Check(Get(kFolderFile) == text, "a refused file is left alone", text);
     std::vector<Folder> folders(1);
     Check(!IndexMgr::List(folders) && folders.size() == 1, "a failed listing leaves its output");
     Check(!IndexMgr::IsPathIndexed("/photos") && !IndexMgr::IsShareIndexed("photos"),
@@ -59,11 +59,11 @@ void CheckRefused(const std::string &text, bool isJson) {
 
 void CheckSaving(Folders &settings) {
     Check(settings.Save(), "settings that were loaded can be saved");
-    const std::string saved = Get(kFolderConf);
+    const std::string saved = Get(kFolderFile);
     Folders again;
     Check(again.Load(), "a saved file loads", saved);
     Check(AsJson(again) == AsJson(settings), "what was saved is what is loaded", saved);
-    Check(again.Save() && Get(kFolderConf) == saved, "saving is stable", saved);
+    Check(again.Save() && Get(kFolderFile) == saved, "saving is stable", saved);
 }
 
 // A path with a trailing "/" meets only what is stored with one.
@@ -149,7 +149,7 @@ void CheckAddingAndDeleting(Folders &settings) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
     const Run run;
     const std::string text(reinterpret_cast<const char *>(data), size);
-    PutFile(kFolderConf, text);
+    PutFile(kFolderFile, text);
     const auto conf = Parse(text);
     Folders settings;
     const bool loaded = settings.Load();

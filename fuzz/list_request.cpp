@@ -137,7 +137,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     }
     const Run run;
     const Json::Value &conf = (*input)["folders"];
-    PutFile(kFolderConf, Text(conf));
+    PutFile(kFolderFile, Text(conf));
     if ((*input)["queue"].isString()) {
         PutFile(QueueOf("photos"), (*input)["queue"].asString());
     }

@@ -14,6 +14,7 @@
 #include "indexing_peer/command_socket.h"
 #include "indexing_peer/json_text.h"
 #include "indexing_peer/pause_state.h"
+#include "support/appliance.h"
 #include "support/check.h"
 #include "support/json_grammar.h"
 #include "support/naive.h"
@@ -27,7 +28,6 @@ using VANO::FILEINDEX::UniqueFd;
 using VANO::TESTS::CommandBytes;
 using VANO::TESTS::ConnectTo;
 
-constexpr char kSocket[] = "/var/run/fileindexd.sock";
 constexpr std::size_t kLengthBytes = sizeof(std::uint32_t);
 
 struct Command {
@@ -106,7 +106,7 @@ Peer &ThePeer() {
 }
 
 void Send(const std::string &bytes) {
-    const UniqueFd connection(ConnectTo(kSocket));
+    const UniqueFd connection(ConnectTo(VANO::TESTS::kDaemonSocket));
     Check(static_cast<bool>(connection), "the peer listens");
     Check(bytes.empty() || ::send(connection.Get(), bytes.data(), bytes.size(), MSG_NOSIGNAL) ==
                                static_cast<ssize_t>(bytes.size()),

@@ -97,7 +97,7 @@ class Model {
 };
 
 void CheckSettings(const Model &model, const std::string &before, bool isAccepted) {
-    const std::string now = Get(kFolderConf);
+    const std::string now = Get(kFolderFile);
     if (!isAccepted) {
         Check(now == before, "a request that is refused changes nothing", now);
         return;
@@ -137,7 +137,7 @@ void CheckMonitor(const Model &model) {
 }
 
 void CheckUpsert(Run &run, Model &model, const Json::Value &request) {
-    const std::string before = Get(kFolderConf);
+    const std::string before = Get(kFolderFile);
     ErrorHandler::SetError(FILEINDEX_ERR_NONE);
     const bool isDone = IndexMgr::Upsert(request);
     const bool isAccepted = model.Upsert(request);
@@ -161,7 +161,7 @@ void CheckUpsert(Run &run, Model &model, const Json::Value &request) {
 }
 
 void CheckDelete(Run &run, Model &model, const Json::Value &request) {
-    const std::string before = Get(kFolderConf);
+    const std::string before = Get(kFolderFile);
     const bool isDone = IndexMgr::Delete(request);
     const bool isAccepted = model.Delete(request);
     CheckSettings(model, before, isAccepted);
@@ -195,12 +195,12 @@ void CheckDeleteAfterUpsert(Model &model, Run &run) {
         return;
     }
     Check(IndexMgr::Upsert(Json::Value(Json::arrayValue)), "an empty request is done");
-    const std::string before = Get(kFolderConf);
+    const std::string before = Get(kFolderFile);
     CheckUpsert(run, model, request);
     Json::Value path;
     path.append(kNewFolder);
     CheckDelete(run, model, path);
-    Check(Get(kFolderConf) == before, "a deletion restores what was", before);
+    Check(Get(kFolderFile) == before, "a deletion restores what was", before);
 }
 
 } // namespace
@@ -213,7 +213,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     Run run;
     const Json::Value &conf = (*input)["folders"];
     if (conf.isObject()) {
-        PutFile(kFolderConf, Text(conf));
+        PutFile(kFolderFile, Text(conf));
     }
     Model model(conf.isObject() ? conf : Json::Value());
     const Json::Value &steps = (*input)["steps"];

@@ -15,6 +15,7 @@
 #include "platform/linux/case_fold.h"
 #include "platform/linux/share_table.h"
 #include "platform/vano_platform.h"
+#include "support/appliance.h"
 #include "support/check.h"
 #include "support/descriptors.h"
 #include "support/log_tap.h"
@@ -27,8 +28,7 @@ using namespace VANO::FUZZ;
 using VANO::PLATFORM::CaseFoldKey;
 using VANO::PLATFORM::ReadTableEntry;
 using VANO::PLATFORM::TableShare;
-
-constexpr char kTable[] = "/usr/vano/etc/shares.json";
+using VANO::TESTS::kShareTable;
 
 struct FreeShare {
     void operator()(_tag_VANOSHARE *share) const { VANOShareFree(share); }
@@ -157,8 +157,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     VANO::TESTS::RequireSandbox();
     const Descriptors descriptors;
     const std::string text(reinterpret_cast<const char *>(data), size);
-    (void)std::remove(kTable);
-    Check(WriteFile(kTable, text), "the table can be written");
+    (void)std::remove(kShareTable);
+    Check(WriteFile(kShareTable, text), "the table can be written");
     const auto table = Parse(text);
     const auto shares = NaiveShares(table);
     std::vector<std::string> names;

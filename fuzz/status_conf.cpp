@@ -59,19 +59,19 @@ void CheckMarks(const Json::Value &conf) {
 // Runs a writer on the file `text`. What it left when it succeeded, none when it failed or the JSON
 // library threw.
 std::optional<Json::Value> Write(const std::string &text, const std::function<bool()> &writer) {
-    PutFile(kStatusConf, text);
+    PutFile(kStatusFile, text);
     bool written = false;
     try {
         written = writer();
     } catch (const Json::Exception &) {
-        Check(Get(kStatusConf) == text, "a writer that throws leaves the file", text);
+        Check(Get(kStatusFile) == text, "a writer that throws leaves the file", text);
         return std::nullopt;
     }
     if (!written) {
-        Check(Get(kStatusConf) == text, "a writer that fails leaves the file", text);
+        Check(Get(kStatusFile) == text, "a writer that fails leaves the file", text);
         return std::nullopt;
     }
-    const std::string saved = Get(kStatusConf);
+    const std::string saved = Get(kStatusFile);
     const auto conf = Parse(saved);
     Check(conf.has_value(), "a saved file is JSON", saved);
     return conf;
@@ -141,7 +141,7 @@ void CheckUpdated(const std::string &text, const Json::Value &conf) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size) {
     Run run;
     const std::string text(reinterpret_cast<const char *>(data), size);
-    PutFile(kStatusConf, text);
+    PutFile(kStatusFile, text);
     const auto conf = Parse(text);
     if (!conf) {
         long long time = 4711;

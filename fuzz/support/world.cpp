@@ -26,10 +26,7 @@ namespace {
 using FILEINDEX::UniqueFd;
 using TESTS::FakePlatform;
 
-constexpr char kSettingsDirectory[] = "/usr/vano/etc/fileindex";
-constexpr char kSocket[] = "/var/run/fileindexd.sock";
 constexpr int kBacklog = 4096;
-constexpr const char *kLocks[] = {"/tmp/fileidx_cfg_folder.lock", "/tmp/fileidx_cfg_status.lock"};
 
 // Made once, with the first input.
 struct World {
@@ -45,10 +42,10 @@ struct World {
             }
             TESTS::MakeDirs("/volume1/" + share + "/@eaDir");
         }
-        TESTS::MakeDirs(kSettingsDirectory);
+        TESTS::MakeDirs(TESTS::kSettingsDirectory);
     }
 
-    int listener = TESTS::ListenAt(kSocket, SOCK_STREAM | SOCK_NONBLOCK, kBacklog);
+    int listener = TESTS::ListenAt(TESTS::kDaemonSocket, SOCK_STREAM | SOCK_NONBLOCK, kBacklog);
 };
 
 World &TheWorld() {
@@ -90,7 +87,7 @@ const std::vector<std::string> &ShareNames() {
 }
 
 std::string QueueOf(const std::string &share) {
-    return "/volume1/" + share + "/@eaDir/VANO@file_index_queue";
+    return TESTS::QueueOf("/volume1/" + share);
 }
 
 Run::Run() : descriptors_(DescriptorsOfTheWorld()) {
@@ -98,8 +95,8 @@ Run::Run() : descriptors_(DescriptorsOfTheWorld()) {
         (void)::unlink(QueueOf(share).c_str());
         (void)::unlink((QueueOf(share) + ".tmp").c_str());
     }
-    (void)::unlink(kFolderConf);
-    (void)::unlink(kStatusConf);
+    (void)::unlink(kFolderFile);
+    (void)::unlink(kStatusFile);
     FakePlatform::Get().monitorCalls.clear();
     FakePlatform::Get().spotlight = false;
     TESTS::EventTrace::Get().Clear();
@@ -112,10 +109,10 @@ Run::~Run() {
     descriptors_.CheckNoneLeft();
     Check(FakePlatform::Get().LiveRecords() == 0, "every share record is released");
     Check(FakePlatform::Get().Violations().empty(), "the platform is called as it wants to be");
-    for (const char *lock : kLocks) {
+    for (const char *lock : {TESTS::kFolderLock, TESTS::kStatusLock}) {
         Check(!TESTS::IsLocked(lock), "every lock is released", lock);
     }
-    for (const std::string &name : TESTS::NamesIn(kSettingsDirectory)) {
+    for (const std::string &name : TESTS::NamesIn(TESTS::kSettingsDirectory)) {
         Check(name == "folder.conf" || name == "status.conf",
               "no other file is left beside the settings", name);
     }

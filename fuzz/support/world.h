@@ -8,13 +8,14 @@
 #include <string>
 #include <vector>
 
+#include "support/appliance.h"
 #include "support/descriptors.h"
 #include "support/files.h"
 
 namespace VANO::FUZZ {
 
-constexpr char kFolderConf[] = "/usr/vano/etc/fileindex/folder.conf";
-constexpr char kStatusConf[] = "/usr/vano/etc/fileindex/status.conf";
+using TESTS::kFolderFile;
+using TESTS::kStatusFile;
 
 // The shares' names; each lies at "/volume1/<name>" and has the folders "a" and "2016".
 const std::vector<std::string> &ShareNames();

@@ -119,13 +119,12 @@ TEST_F(FileIoTest, AFileThatGrowsIsReadToItsEnd) {
     for (const std::size_t limit : {std::size_t{20010}, std::size_t{20009}}) {
         PutFile(kFile, std::string(10, 'a'));
         bool hasGrown = false;
-        Fault::On(Call::Read, [&](CallInfo &) -> std::optional<long> {
+        Fault::Before(Call::Read, [&](CallInfo &) {
             if (!hasGrown) {
                 hasGrown = true;
                 const KitScope kit;
                 PutFile(kFile, std::string(20010, 'b'));
             }
-            return std::nullopt;
         });
         std::string read;
         EXPECT_EQ(ReadFile(read, kFile, limit), limit == 20010U);
@@ -459,10 +458,7 @@ TEST_F(FileIoTest, NothingIsRemovedAfterASuccess) {
 
 TEST_F(FileIoTest, AFailureIsToldWhateverRemovingTheTemporaryFileSays) {
     Fault::Fail(Call::Fsync, ENOSPC);
-    Fault::On(Call::Unlink, [](CallInfo &) -> std::optional<long> {
-        errno = EIO;
-        return std::nullopt;
-    });
+    Fault::Before(Call::Unlink, [](CallInfo &) { errno = EIO; });
     EXPECT_FALSE(WriteFile(kFile, "new"));
     EXPECT_EQ(errno, ENOSPC);
 }
@@ -481,10 +477,7 @@ TEST_F(FileIoTest, TheFirstDescriptorIsClosedLikeAnyOther) {
 
 TEST_F(FileIoTest, AFailureIsToldWhateverClosingSays) {
     Fault::Fail(Call::Fsync, ENOSPC);
-    Fault::On(Call::Close, [](CallInfo &) -> std::optional<long> {
-        errno = EIO;
-        return std::nullopt;
-    });
+    Fault::Before(Call::Close, [](CallInfo &) { errno = EIO; });
     errno = 0;
     EXPECT_FALSE(WriteFile(kFile, "new"));
     EXPECT_EQ(errno, ENOSPC);

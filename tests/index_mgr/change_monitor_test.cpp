@@ -143,7 +143,7 @@ TEST_F(ChangeMonitorTest, AShareMayLieDeep) {
     EXPECT_TRUE(IndexMgr::DeleteVANotifydCfg("deep"));
     EXPECT_TRUE(IndexMgr::CleanShareIndexData("deep"));
     EXPECT_THAT(Steps(), ElementsAre(Watched(share, {share + "/a"}), Unwatched(share),
-                                     Removed(QueueOf(share)), Removed(QueueOf(share) + ".tmp"),
+                                     Removed(QueueOf(share)), Removed(TakenOf(share)),
                                      Removed(DatabaseOf(share))));
 }
 

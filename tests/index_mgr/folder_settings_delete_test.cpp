@@ -15,7 +15,7 @@ std::string Told(const std::string &path) {
 }
 
 std::vector<std::string> Dropped(const std::string &directory) {
-    return {Removed(QueueOf(directory)), Removed(QueueOf(directory) + ".tmp"),
+    return {Removed(QueueOf(directory)), Removed(TakenOf(directory)),
             Removed(DatabaseOf(directory)), Unwatched(directory)};
 }
 
@@ -58,9 +58,9 @@ TEST_F(DeleteTest, EveryPartyIsToldInOrderUnderTheLock) {
                             Told("/photos/a"), Made(kPhotos), Locked(QueueOf(kPhotos)),
                             Changed(QueueOf(kPhotos)), Unlocked(QueueOf(kPhotos)), Made(kPhotos),
                             Watched(kPhotos, {"/volume1/photos/b"}), Made(kVideo),
-                            Removed(QueueOf(kVideo)), Removed(QueueOf(kVideo) + ".tmp"),
-                            Made(kVideo), Removed(DatabaseOf(kVideo)), Made(kVideo),
-                            Unwatched(kVideo), Unlocked(kFolderLock)));
+                            Removed(QueueOf(kVideo)), Removed(TakenOf(kVideo)), Made(kVideo),
+                            Removed(DatabaseOf(kVideo)), Made(kVideo), Unwatched(kVideo),
+                            Unlocked(kFolderLock)));
     EXPECT_THAT(StoredPaths(), ElementsAre("/photos/b"));
     ExpectError(FILEINDEX_ERR_NONE);
 }
@@ -144,9 +144,8 @@ TEST_F(DeleteTest, TheLastFolderStopsTheServicesAndTellsNobodyElse) {
     EXPECT_THAT(Effects(),
                 ElementsAre(Locked(kFolderLock), Changed(kFolderFile), kStopped, kSpotlightOff,
                             kRestarted, Made(kPhotos), Removed(QueueOf(kPhotos)),
-                            Removed(QueueOf(kPhotos) + ".tmp"), Made(kPhotos),
-                            Removed(DatabaseOf(kPhotos)), Made(kPhotos), Unwatched(kPhotos),
-                            Unlocked(kFolderLock)));
+                            Removed(TakenOf(kPhotos)), Made(kPhotos), Removed(DatabaseOf(kPhotos)),
+                            Made(kPhotos), Unwatched(kPhotos), Unlocked(kFolderLock)));
     EXPECT_EQ(ReadJson(kFolderFile), Json("{}"));
     EXPECT_FALSE(platform.spotlight);
 }

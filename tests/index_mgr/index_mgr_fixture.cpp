@@ -13,14 +13,6 @@ bool StartsWith(const std::string &text, const std::string &start) {
 
 } // namespace
 
-std::string QueueOf(const std::string &directory) {
-    return directory + "/@eaDir/VANO@file_index_queue";
-}
-
-std::string DatabaseOf(const std::string &directory) {
-    return directory + "/@eaDir/VANO@.fileindexdb";
-}
-
 std::string Changed(const std::string &file) {
     return "file: " + file;
 }

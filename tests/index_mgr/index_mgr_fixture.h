@@ -18,16 +18,8 @@
 
 namespace VANO::TESTS {
 
-constexpr char kPhotos[] = "/volume1/photos";
 constexpr char kVideo[] = "/volume1/video";
 constexpr char kMusic[] = "/volume2/music";
-
-constexpr int kReindexEvent = 65536;
-constexpr int kSettingEvent = 131072;
-
-// The locations inside a share's directory.
-std::string QueueOf(const std::string &directory);
-std::string DatabaseOf(const std::string &directory);
 
 // Entries of the event trace.
 std::string Changed(const std::string &file);

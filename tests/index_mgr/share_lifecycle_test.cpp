@@ -382,9 +382,9 @@ class CleanShareIndexDataTest : public IndexMgrTest {};
 TEST_F(CleanShareIndexDataTest, QueueTakenQueueAndDatabaseAreRemovedInOrder) {
     Watch();
     EXPECT_TRUE(IndexMgr::CleanShareIndexData("photos"));
-    EXPECT_THAT(Effects(), ElementsAre(Made(kPhotos), Removed(QueueOf(kPhotos)),
-                                       Removed(QueueOf(kPhotos) + ".tmp"), Made(kPhotos),
-                                       Removed(DatabaseOf(kPhotos))));
+    EXPECT_THAT(Effects(),
+                ElementsAre(Made(kPhotos), Removed(QueueOf(kPhotos)), Removed(TakenOf(kPhotos)),
+                            Made(kPhotos), Removed(DatabaseOf(kPhotos))));
 }
 
 TEST_F(CleanShareIndexDataTest, WhatDoesNotExistIsNoFailure) {
@@ -454,8 +454,7 @@ TEST_F(CleanShareIndexDataTest, AShareThatVanishesMeanwhileKeepsItsDatabase) {
     EXPECT_FALSE(IndexMgr::CleanShareIndexData("photos"));
     ExpectLog({"utils:736 VANOShareGet failed, name=photos, code=0",
                "index_mgr:* FILEIDXDBPathGet failed, share=photos"});
-    EXPECT_THAT(Steps(),
-                ElementsAre(Removed(QueueOf(kPhotos)), Removed(QueueOf(kPhotos) + ".tmp")));
+    EXPECT_THAT(Steps(), ElementsAre(Removed(QueueOf(kPhotos)), Removed(TakenOf(kPhotos))));
 }
 
 TEST_F(CleanShareIndexDataTest, NoLockIsTakenAndNoSettingRead) {
@@ -471,9 +470,8 @@ TEST_F(CleanShareIndexDataTest, ShareNamesAreBytes) {
         platform.AddShare(share, directory);
         Watch();
         EXPECT_TRUE(IndexMgr::CleanShareIndexData(share));
-        EXPECT_THAT(Steps(),
-                    ElementsAre(Removed(QueueOf(directory)), Removed(QueueOf(directory) + ".tmp"),
-                                Removed(DatabaseOf(directory))));
+        EXPECT_THAT(Steps(), ElementsAre(Removed(QueueOf(directory)), Removed(TakenOf(directory)),
+                                         Removed(DatabaseOf(directory))));
     }
 }
 

@@ -15,6 +15,7 @@
 #include "platform/diagnosis.h"
 #include "platform/linux/error_codes.h"
 #include "platform/vano_platform.h"
+#include "support/appliance.h"
 #include "support/fault.h"
 #include "support/files.h"
 #include "support/system_log.h"
@@ -23,8 +24,6 @@ namespace {
 
 using namespace VANO::TESTS;
 using namespace VANO::PLATFORM;
-
-constexpr char kTable[] = "/usr/vano/etc/shares.json";
 
 struct FreeShare {
     void operator()(_tag_VANOSHARE *share) const { VANOShareFree(share); }
@@ -65,16 +64,16 @@ const std::string kRepeated = "it repeats another share's name or directory";
 class ShareTest : public ::testing::Test {
   protected:
     void SetUp() override {
-        RemoveTree(kTable);
+        RemoveTree(kShareTable);
         (void)VANOShareIsShareRecycle("/none"); // takes note of the missing table
         (void)SystemLog::Get().Lines();
     }
-    void TearDown() override { RemoveTree(kTable); }
+    void TearDown() override { RemoveTree(kShareTable); }
 
     // As an administrator's tool does it: a new file in the old one's place.
     static void PutTable(const std::string &text) {
-        PutFile(std::string(kTable) + ".new", text);
-        ASSERT_EQ(0, std::rename((std::string(kTable) + ".new").c_str(), kTable));
+        PutFile(std::string(kShareTable) + ".new", text);
+        ASSERT_EQ(0, std::rename((std::string(kShareTable) + ".new").c_str(), kShareTable));
     }
     static void ExpectLog(const std::vector<std::string> &texts, int line = __builtin_LINE()) {
         SystemLog::Get().Expect(texts, __FILE__, line);
@@ -124,11 +123,11 @@ TEST_F(ShareTest, SlashesTooManyInTheTableAreDropped) {
 TEST_F(ShareTest, AMissingTableHoldsNoSharesAndIsLoggedOnce) {
     PutTable("{}");
     EXPECT_EQ(kUnknown, Found("photos"));
-    RemoveTree(kTable);
+    RemoveTree(kShareTable);
     EXPECT_EQ(kUnusable, Found("photos"));
     EXPECT_EQ(kUnusable, Found("photos"));
     EXPECT_EQ(kUnusable, Split("/volume1/photos"));
-    ExpectLog({std::string("share_table:* share table cannot be read, path=") + kTable +
+    ExpectLog({std::string("share_table:* share table cannot be read, path=") + kShareTable +
                ", reason=No such file or directory"});
 }
 
@@ -138,7 +137,8 @@ TEST_F(ShareTest, MalformedTablesHoldNoSharesAndAreLoggedOnceEach) {
         PutTable(text);
         EXPECT_EQ(kUnusable, Found("photos")) << text;
         EXPECT_EQ(kUnusable, Found("photos")) << text;
-        ExpectLog({std::string("share_table:* share table is not a JSON object, path=") + kTable});
+        ExpectLog(
+            {std::string("share_table:* share table is not a JSON object, path=") + kShareTable});
     }
     PutTable(R"({"photos":"/volume1/photos"})");
     EXPECT_EQ("photos at /volume1/photos", Found("photos"));
@@ -150,7 +150,7 @@ TEST_F(ShareTest, ATableNestedTooDeepIsMalformed) {
 }
 
 TEST_F(ShareTest, ADirectoryInTheTablesPlaceIsUnreadable) {
-    MakeDirs(kTable);
+    MakeDirs(kShareTable);
     EXPECT_EQ(kUnusable, Found("photos"));
     EXPECT_EQ(kUnusable, Found("photos"));
     EXPECT_EQ(1U, SystemLog::Get().Lines().size());
@@ -158,14 +158,14 @@ TEST_F(ShareTest, ADirectoryInTheTablesPlaceIsUnreadable) {
 
 TEST_F(ShareTest, ATableWithoutPermissionIsNoticedWhenItCanBeRead) {
     PutTable(R"({"photos":"/volume1/photos"})");
-    ASSERT_EQ(0, ::chmod(kTable, 0));
+    ASSERT_EQ(0, ::chmod(kShareTable, 0));
     if (::seteuid(65534) != 0) {
         GTEST_SKIP() << "there is one user only here";
     }
     const std::string before = Found("photos");
     ASSERT_EQ(0, ::seteuid(0));
     EXPECT_EQ(kUnusable, before);
-    ASSERT_EQ(0, ::chmod(kTable, 0644));
+    ASSERT_EQ(0, ::chmod(kShareTable, 0644));
     EXPECT_EQ("photos at /volume1/photos", Found("photos"));
 }
 
@@ -222,11 +222,11 @@ TEST_F(ShareTest, ATableOfNoUseIsTheOnlyFault) {
     using Kind = StoreFault::Kind;
     const auto expectFault = [](Kind kind, const char *reason) {
         const ShareList list = ListShares();
-        EXPECT_EQ(kTable, list.file);
+        EXPECT_EQ(kShareTable, list.file);
         EXPECT_TRUE(list.names.empty());
         ASSERT_EQ(1U, list.faults.size());
         EXPECT_EQ(kind, list.faults[0].kind);
-        EXPECT_EQ(kTable, list.faults[0].file);
+        EXPECT_EQ(kShareTable, list.faults[0].file);
         EXPECT_EQ(reason, list.faults[0].reason);
     };
     expectFault(Kind::kMissing, "No such file or directory");
@@ -257,9 +257,9 @@ TEST_F(ShareTest, AChangedTableIsNoticedAtTheNextCall) {
     PutTable(R"({"photos":"/volume2/photos"})"); // of the same size
     EXPECT_EQ("photos at /volume2/photos", Found("photos"));
     EXPECT_EQ(kOutside, Split("/volume1/photos"));
-    PutFile(kTable, R"({"photos":"/volume2/photos","music":"/volume3/music"})"); // in place
+    PutFile(kShareTable, R"({"photos":"/volume2/photos","music":"/volume3/music"})"); // in place
     EXPECT_EQ("music at /volume3/music", Found("music"));
-    RemoveTree(kTable);
+    RemoveTree(kShareTable);
     EXPECT_EQ(kUnusable, Found("music"));
     PutTable(R"({"music":"/volume4/music"})");
     EXPECT_EQ("music at /volume4/music", Found("music"));
@@ -420,7 +420,7 @@ TEST_F(ShareTest, APassingFailureToReadTheTableIsNotRemembered) {
         EXPECT_EQ(kUnusable, Found("photos")) << error;
         EXPECT_EQ("photos at /volume1/photos", Found("photos")) << error;
         Fault::Reset();
-        ExpectLog({std::string("share_table:* share table cannot be read, path=") + kTable +
+        ExpectLog({std::string("share_table:* share table cannot be read, path=") + kShareTable +
                    ", reason=" + std::strerror(error)});
         PutTable(R"({"photos":"/volume1/photos"})"); // another file, to be read anew
     }
@@ -434,7 +434,7 @@ TEST_F(ShareTest, ATableThatWasReadInPartIsNotRemembered) {
     EXPECT_EQ(kUnusable, Found("photos"));
     EXPECT_EQ("photos at /volume1/photos", Found("photos"));
     Fault::Reset();
-    ExpectLog({std::string("share_table:* share table is not a JSON object, path=") + kTable});
+    ExpectLog({std::string("share_table:* share table is not a JSON object, path=") + kShareTable});
 }
 
 TEST_F(ShareTest, AFailureToReadTheTableThatStaysIsLoggedOnce) {

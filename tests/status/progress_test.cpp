@@ -13,8 +13,6 @@ namespace {
 
 constexpr long long kNow = 1700000000;
 constexpr char kFolder[] = "/photos/trip";
-constexpr char kQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";
-constexpr char kTaken[] = "/volume1/photos/@eaDir/VANO@file_index_queue.tmp";
 constexpr char kWaiting[] = R"({"event":131072,"path":"/volume1/photos/trip","data":{}})"
                             "\n";
 
@@ -73,13 +71,13 @@ constexpr PauseRow kPauses[] = {
 
 TEST_F(ProgressTest, AFolderWithoutAQueueIsFinished) {
     EXPECT_EQ(StatusOf(), "finished");
-    EXPECT_FALSE(Exists(kQueue));
+    EXPECT_FALSE(Exists(kPhotoQueue));
     ExpectLog({});
     ExpectError(FILEINDEX_ERR_NONE);
 }
 
 TEST_F(ProgressTest, AFolderWithAWaitingEventFollowsThePause) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EXPECT_EQ(StatusOf(), "processing");
     for (const PauseRow &row : kPauses) {
         PutFile(kStatusFile, row.status);
@@ -88,7 +86,7 @@ TEST_F(ProgressTest, AFolderWithAWaitingEventFollowsThePause) {
 }
 
 TEST_F(ProgressTest, AFinishedFolderIsFinishedUnderAnyPause) {
-    PutFile(kQueue, Event("/volume1/photos/other"));
+    PutFile(kPhotoQueue, Event("/volume1/photos/other"));
     for (const PauseRow &row : kPauses) {
         PutFile(kStatusFile, row.status);
         EXPECT_EQ(StatusOf(), "finished") << row.status;
@@ -96,15 +94,15 @@ TEST_F(ProgressTest, AFinishedFolderIsFinishedUnderAnyPause) {
 }
 
 TEST_F(ProgressTest, TheTakenOverQueueCountsToo) {
-    PutFile(kTaken, kWaiting);
+    PutFile(kPhotoTaken, kWaiting);
     EXPECT_EQ(StatusOf(), "processing");
-    PutFile(kQueue, Event("/volume1/photos/other"));
+    PutFile(kPhotoQueue, Event("/volume1/photos/other"));
     EXPECT_EQ(StatusOf(), "processing");
 }
 
 TEST_F(ProgressTest, AHitInTheQueueSparesTheTakenOverOne) {
-    PutFile(kQueue, kWaiting);
-    PutFile(kTaken, "malformed\n");
+    PutFile(kPhotoQueue, kWaiting);
+    PutFile(kPhotoTaken, "malformed\n");
     EXPECT_EQ(StatusOf(), "processing");
     ExpectLog({});
 }
@@ -112,7 +110,7 @@ TEST_F(ProgressTest, AHitInTheQueueSparesTheTakenOverOne) {
 TEST_F(ProgressTest, AFolderThatCannotBeIndexedIsPaused) {
     platform.FindShare("photos")->readOnly = true;
     EXPECT_EQ(StatusOf(), "paused");
-    PutFile(kQueue, "malformed\n");
+    PutFile(kPhotoQueue, "malformed\n");
     PutFile(kStatusFile, R"({"resume_time":-1,"no_space":{"photos":true}})");
     EXPECT_EQ(StatusOf(), "paused") << "asked before anything else";
     ExpectLog({});
@@ -133,17 +131,17 @@ TEST_F(ProgressTest, AnEmptyPathIsPaused) {
 TEST_F(ProgressTest, AShareOutOfSpaceIsToldWhetherOrNotWorkWaits) {
     PutFile(kStatusFile, R"({"resume_time":0,"no_space":{"photos":true}})");
     EXPECT_EQ(StatusOf(), "err_no_space");
-    PutFile(kQueue, "malformed\n");
+    PutFile(kPhotoQueue, "malformed\n");
     EXPECT_EQ(StatusOf(), "err_no_space");
     EXPECT_EQ(platform.Calls("VANOEAMKDir"), 0U) << "the queue does not matter";
     ExpectLog({});
     PutFile(kStatusFile, R"({"resume_time":0,"no_space":{"video":true}})");
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EXPECT_EQ(StatusOf(), "paused");
 }
 
 TEST_F(ProgressTest, AnUnknownQueueLocationReadsAsFinished) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     platform.lastError = 0x1400;
     platform.Answer("VANOShareGet", {0, 0, -1});
     EXPECT_EQ(StatusOf(), "finished");
@@ -153,7 +151,7 @@ TEST_F(ProgressTest, AnUnknownQueueLocationReadsAsFinished) {
 
 // A path that had to be cut would be the beginning of another one.
 TEST_F(ProgressTest, AQueueLocationThatIsTooLongReadsAsFinished) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     platform.AnswerAlways("VANOEAMKDir", 0);
     const std::size_t rest = std::string("/volume1//@eaDir/VANO@file_index_queue").size();
     for (const std::size_t size : {4095U, 4096U}) {
@@ -175,8 +173,8 @@ TEST_F(ProgressTest, AQueueLocationThatIsTooLongReadsAsFinished) {
 }
 
 TEST_F(ProgressTest, AFolderThatNoLongerResolvesIsInNoQueue) {
-    PutFile(kQueue, kWaiting);
-    PutFile(kTaken, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
+    PutFile(kPhotoTaken, kWaiting);
     platform.Answer("VANOShareGet", {0, 0, 0, -1, -1});
     EXPECT_EQ(StatusOf(), "finished");
     ExpectLog({"status_mgr:30 Cannot get full path: /photos/trip",
@@ -193,49 +191,48 @@ TEST_F(ProgressTest, AMissingQueueIsNotWorthResolvingTheFolder) {
 }
 
 TEST_F(ProgressTest, AnUnreadableQueueIsLoggedAndHoldsNothing) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     Fault::FailPath(Call::Open, "VANO@file_index_queue", EACCES);
     EXPECT_EQ(StatusOf(), "finished");
-    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kQueue +
+    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kPhotoQueue +
                ", reason=Permission denied"});
-    PutFile(kTaken, kWaiting);
+    PutFile(kPhotoTaken, kWaiting);
     EXPECT_EQ(StatusOf(), "processing");
-    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kQueue +
+    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kPhotoQueue +
                ", reason=Permission denied"});
     Fault::FailPath(Call::Open, ".tmp", ENFILE);
-    PutFile(kQueue, "");
+    PutFile(kPhotoQueue, "");
     EXPECT_EQ(StatusOf(), "finished");
-    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kTaken +
+    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kPhotoTaken +
                ", reason=Too many open files in system"});
 }
 
 TEST_F(ProgressTest, OnlyARegularFileIsAQueue) {
     MakeDirs("/volume1/photos/@eaDir");
     PutFile("/volume2/target", kWaiting);
-    ASSERT_EQ(::symlink("/volume2/target", kQueue), 0);
+    ASSERT_EQ(::symlink("/volume2/target", kPhotoQueue), 0);
     EXPECT_EQ(StatusOf(), "finished");
-    ASSERT_EQ(::unlink(kQueue), 0);
-    ASSERT_EQ(::mkfifo(kQueue, 0600), 0);
+    ASSERT_EQ(::unlink(kPhotoQueue), 0);
+    ASSERT_EQ(::mkfifo(kPhotoQueue, 0600), 0);
     EXPECT_EQ(StatusOf(), "finished");
-    ASSERT_EQ(::unlink(kQueue), 0);
-    MakeDirs(kQueue);
+    ASSERT_EQ(::unlink(kPhotoQueue), 0);
+    MakeDirs(kPhotoQueue);
     EXPECT_EQ(StatusOf(), "finished");
     ExpectLog({});
 }
 
 TEST_F(ProgressTest, ALinkPutInPlaceOfTheQueueIsNotFollowed) {
-    PutFile(kQueue, Event("/volume1/photos/other"));
+    PutFile(kPhotoQueue, Event("/volume1/photos/other"));
     PutFile("/volume2/target", kWaiting);
     // After the look at what it is, before it is opened.
-    Fault::On(Call::Open, [](CallInfo &info) -> std::optional<long> {
-        if (info.path == kQueue) {
-            ::unlink(kQueue);
-            EXPECT_EQ(::symlink("/volume2/target", kQueue), 0);
+    Fault::Before(Call::Open, [](CallInfo &info) {
+        if (info.path == kPhotoQueue) {
+            ::unlink(kPhotoQueue);
+            EXPECT_EQ(::symlink("/volume2/target", kPhotoQueue), 0);
         }
-        return std::nullopt;
     });
     EXPECT_EQ(StatusOf(), "finished");
-    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kQueue +
+    ExpectLog({std::string("status_mgr:37 Failed to open queue=") + kPhotoQueue +
                ", reason=Too many levels of symbolic links"});
 }
 
@@ -259,14 +256,14 @@ TEST_F(ProgressTest, AnEventBelongsToTheFolderAtOrAboveIt) {
         {"", false},
     };
     for (const auto &row : kRows) {
-        PutFile(kQueue, Event(row.path));
+        PutFile(kPhotoQueue, Event(row.path));
         EXPECT_EQ(StatusOf(), row.waits ? "processing" : "finished") << row.path;
     }
 }
 
 TEST_F(ProgressTest, ANeighbourWithALongerNameIsNotTheFolder) {
     MakeDirs("/volume1/photos/trip2");
-    PutFile(kQueue, Event("/volume1/photos/trip2/a.jpg"));
+    PutFile(kPhotoQueue, Event("/volume1/photos/trip2/a.jpg"));
     EXPECT_EQ(StatusOf("/photos/trip"), "finished");
     EXPECT_EQ(StatusOf("/photos/trip2"), "processing");
 }
@@ -274,56 +271,58 @@ TEST_F(ProgressTest, ANeighbourWithALongerNameIsNotTheFolder) {
 TEST_F(ProgressTest, EveryCodeIsAnEvent) {
     for (const char *code :
          {"0", "1", "256", "65536", "131072", "4294967295", "65536.0", "true", "null"}) {
-        PutFile(kQueue, std::string(R"({"event":)") + code +
-                            R"(,"path":"/volume1/photos/trip/a"})"
-                            "\n");
+        PutFile(kPhotoQueue, std::string(R"({"event":)") + code +
+                                 R"(,"path":"/volume1/photos/trip/a"})"
+                                 "\n");
         EXPECT_EQ(StatusOf(), "processing") << code;
     }
 }
 
 TEST_F(ProgressTest, ANonUtf8PathIsComparedByBytes) {
     MakeDirs("/volume1/photos/\xff\xfe");
-    PutFile(kQueue, Event("/volume1/photos/\xff\xfe/a"));
+    PutFile(kPhotoQueue, Event("/volume1/photos/\xff\xfe/a"));
     EXPECT_EQ(StatusOf("/photos/\xff\xfe"), "processing");
     EXPECT_EQ(StatusOf("/photos/trip"), "finished");
 }
 
 TEST_F(ProgressTest, AFormerPathCountsForAMove) {
-    PutFile(kQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip/a"));
+    PutFile(kPhotoQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip/a"));
     EXPECT_EQ(StatusOf(), "processing");
-    PutFile(kQueue, Moved("/volume1/photos/other", "/volume1/photos/trip"));
+    PutFile(kPhotoQueue, Moved("/volume1/photos/other", "/volume1/photos/trip"));
     EXPECT_EQ(StatusOf(), "processing");
-    PutFile(kQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip2/a"));
+    PutFile(kPhotoQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip2/a"));
     EXPECT_EQ(StatusOf(), "finished");
-    PutFile(kQueue, Moved("/volume1/photos/trip/b", "/volume1/photos/other/a"));
+    PutFile(kPhotoQueue, Moved("/volume1/photos/trip/b", "/volume1/photos/other/a"));
     EXPECT_EQ(StatusOf(), "processing");
 }
 
 TEST_F(ProgressTest, AFormerPathCountsForNoOtherCode) {
     for (const int code : {0, 1, 255, 257, 512, 65536, 131072}) {
-        PutFile(kQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip/a", code));
+        PutFile(kPhotoQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip/a", code));
         EXPECT_EQ(StatusOf(), "finished") << code;
     }
 }
 
 TEST_F(ProgressTest, TheLastFormerPathIsCarriedOverLaterEvents) {
-    PutFile(kQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip/a") +
-                        Event("/volume1/photos/other/c") + Event("/volume1/photos/other/d"));
+    PutFile(kPhotoQueue, Moved("/volume1/photos/other/b", "/volume1/photos/trip/a") +
+                             Event("/volume1/photos/other/c") + Event("/volume1/photos/other/d"));
     EXPECT_EQ(StatusOf(), "processing");
-    PutFile(kQueue, Moved("/volume1/photos/x", "/volume1/photos/trip/a") +
-                        Moved("/volume1/photos/x", "/volume1/photos/y"));
+    PutFile(kPhotoQueue, Moved("/volume1/photos/x", "/volume1/photos/trip/a") +
+                             Moved("/volume1/photos/x", "/volume1/photos/y"));
     EXPECT_EQ(StatusOf(), "processing");
-    PutFile(kQueue, Moved("/volume1/photos/x", "/volume1/photos/y") + Event("/volume1/photos/z"));
+    PutFile(kPhotoQueue,
+            Moved("/volume1/photos/x", "/volume1/photos/y") + Event("/volume1/photos/z"));
     EXPECT_EQ(StatusOf(), "finished");
 }
 
 TEST_F(ProgressTest, AFormerPathThatIsNoTextCountsAsEmpty) {
     for (const char *former : {"null", "[]", "{}", "[\"/volume1/photos/trip\"]", "5", "true"}) {
-        PutFile(kQueue, std::string(R"({"event":256,"path":"/volume1/photos/x","path_old":)") +
-                            former + "}\n");
+        PutFile(kPhotoQueue, std::string(R"({"event":256,"path":"/volume1/photos/x","path_old":)") +
+                                 former + "}\n");
         EXPECT_EQ(StatusOf(), "finished") << former;
-        PutFile(kQueue, std::string(R"({"event":256,"path":"/volume1/photos/trip","path_old":)") +
-                            former + "}\n");
+        PutFile(kPhotoQueue,
+                std::string(R"({"event":256,"path":"/volume1/photos/trip","path_old":)") + former +
+                    "}\n");
         EXPECT_EQ(StatusOf(), "processing") << former;
         ExpectLog({});
     }
@@ -333,16 +332,16 @@ TEST_F(ProgressTest, AMalformedMovesFormerPathIsNotCarriedOver) {
     for (const std::string line :
          {R"({"event":256,"path_old":"/volume1/photos/trip/a"})",
           R"({"event":256,"path":5,"path_old":"/volume1/photos/trip/a"})"}) {
-        PutFile(kQueue, line + "\n" + Event("/volume1/photos/other"));
+        PutFile(kPhotoQueue, line + "\n" + Event("/volume1/photos/other"));
         EXPECT_EQ(StatusOf(), "finished") << line;
         ExpectLog({Malformed(line)});
     }
 }
 
 TEST_F(ProgressTest, AMoveWithoutAFormerPathIsAnEvent) {
-    PutFile(kQueue, Event("/volume1/photos/trip/a", 256));
+    PutFile(kPhotoQueue, Event("/volume1/photos/trip/a", 256));
     EXPECT_EQ(StatusOf(), "processing");
-    PutFile(kQueue, Event("/volume1/photos/other", 256));
+    PutFile(kPhotoQueue, Event("/volume1/photos/other", 256));
     EXPECT_EQ(StatusOf(), "finished");
     ExpectLog({});
 }
@@ -376,10 +375,10 @@ TEST_F(ProgressTest, AMalformedLineIsLoggedAndSkipped) {
                                    R"([{"event":1,"path":"/volume1/photos/trip"}])",
                                    "\xff\xfe",
                                    "%s%n%d"}) {
-        PutFile(kQueue, line + "\n");
+        PutFile(kPhotoQueue, line + "\n");
         EXPECT_EQ(StatusOf(), "finished") << line;
         ExpectLog({Malformed(line)});
-        PutFile(kQueue, line + "\n" + kWaiting);
+        PutFile(kPhotoQueue, line + "\n" + kWaiting);
         EXPECT_EQ(StatusOf(), "processing") << line;
         ExpectLog({Malformed(line)});
     }
@@ -387,15 +386,15 @@ TEST_F(ProgressTest, AMalformedLineIsLoggedAndSkipped) {
 }
 
 TEST_F(ProgressTest, TheWholeFileIsReadAfterAHit) {
-    PutFile(kQueue, std::string("first\n") + kWaiting + "second\n" +
-                        Event("/volume1/photos/other") + "third");
+    PutFile(kPhotoQueue, std::string("first\n") + kWaiting + "second\n" +
+                             Event("/volume1/photos/other") + "third");
     EXPECT_EQ(StatusOf(), "processing");
     ExpectLog({Malformed("first"), Malformed("second"), Malformed("third")});
 }
 
 TEST_F(ProgressTest, BothQueuesMalformedLinesAreLogged) {
-    PutFile(kQueue, "one\n");
-    PutFile(kTaken, "two\n");
+    PutFile(kPhotoQueue, "one\n");
+    PutFile(kPhotoTaken, "two\n");
     EXPECT_EQ(StatusOf(), "finished");
     ExpectLog({Malformed("one"), Malformed("two")});
 }
@@ -403,21 +402,21 @@ TEST_F(ProgressTest, BothQueuesMalformedLinesAreLogged) {
 TEST_F(ProgressTest, TheLastLineNeedsNoNewline) {
     std::string line = kWaiting;
     line.pop_back();
-    PutFile(kQueue, line);
+    PutFile(kPhotoQueue, line);
     EXPECT_EQ(StatusOf(), "processing");
     ExpectLog({});
 }
 
 TEST_F(ProgressTest, AnEmptyQueueHoldsNothing) {
-    PutFile(kQueue, "");
+    PutFile(kPhotoQueue, "");
     EXPECT_EQ(StatusOf(), "finished");
     ExpectLog({});
 }
 
 TEST_F(ProgressTest, AReadErrorEndsTheQueue) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     Fault::On(Call::Read, [](CallInfo &info) -> std::optional<long> {
-        if (info.path != kQueue) {
+        if (info.path != kPhotoQueue) {
             return std::nullopt;
         }
         errno = EIO;
@@ -428,7 +427,7 @@ TEST_F(ProgressTest, AReadErrorEndsTheQueue) {
 }
 
 TEST_F(ProgressTest, APauseThatCannotBeReadIsNone) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     PutFile(kStatusFile, R"({"resume_time":"0"})");
     EXPECT_EQ(StatusOf(), "processing");
     ExpectLog({"status:66 json exception"});
@@ -442,17 +441,17 @@ TEST_F(ProgressTest, APauseThatCannotBeReadIsNone) {
 
 TEST_F(ProgressTest, ThePauseIsReadBeforeTheQueue) {
     PutFile(kStatusFile, R"({"resume_time":"0"})");
-    PutFile(kQueue, "malformed\n");
+    PutFile(kPhotoQueue, "malformed\n");
     EXPECT_EQ(StatusOf(), "finished");
     ExpectLog({"status:66 json exception", Malformed("malformed")});
 }
 
 TEST_F(ProgressTest, AskingTakesNoLockAndChangesNothing) {
     SetResumeTime(0);
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EventTrace::Get().WatchFile(kStatusFile);
-    EventTrace::Get().WatchFile(kQueue);
-    const HoldLock queueLock(kQueue);
+    EventTrace::Get().WatchFile(kPhotoQueue);
+    const HoldLock queueLock(kPhotoQueue);
     const HoldLock statusLock(kStatusLock);
     const HoldLock folderLock(kFolderLock);
     EXPECT_EQ(StatusOf(), "paused");
@@ -461,13 +460,13 @@ TEST_F(ProgressTest, AskingTakesNoLockAndChangesNothing) {
 
 TEST_F(ProgressTest, ALongLineIsAnEventToo) {
     const std::string data((std::size_t{1} << 20) - 100, 'x');
-    PutFile(kQueue, R"({"event":1,"path":"/volume1/photos/trip","data":")" + data + "\"}\n");
+    PutFile(kPhotoQueue, R"({"event":1,"path":"/volume1/photos/trip","data":")" + data + "\"}\n");
     EXPECT_EQ(StatusOf(), "processing");
     ExpectLog({});
 }
 
 TEST_F(ProgressTest, AVeryLongMalformedLineIsLoggedCut) {
-    PutFile(kQueue, std::string(std::size_t{10} << 20, 'x') + "\n" + kWaiting);
+    PutFile(kPhotoQueue, std::string(std::size_t{10} << 20, 'x') + "\n" + kWaiting);
     EXPECT_EQ(StatusOf(), "processing");
     const std::vector<LogLine> lines = SystemLog::Get().Lines();
     ASSERT_EQ(lines.size(), 1U);
@@ -503,7 +502,7 @@ class ServiceStatusTest : public ProgressTest {
 };
 
 TEST_F(ServiceStatusTest, WithoutFoldersEverythingIsFinished) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EXPECT_EQ(ServiceStatus(), "finished");
     PutFile(kFolderFile, "{}");
     EXPECT_EQ(ServiceStatus(), "finished");
@@ -530,7 +529,7 @@ TEST_F(ServiceStatusTest, WithoutQueuesEverythingIsFinished) {
 
 TEST_F(ServiceStatusTest, AQueueFollowsThePause) {
     SetFolders({"/photos/trip"});
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EXPECT_EQ(ServiceStatus(), "processing");
     for (const PauseRow &row : kPauses) {
         PutFile(kStatusFile, row.status);
@@ -540,34 +539,34 @@ TEST_F(ServiceStatusTest, AQueueFollowsThePause) {
 
 TEST_F(ServiceStatusTest, ATakenOverQueueAloneIsWork) {
     SetFolders({"/photos/trip"});
-    PutFile(kTaken, "");
+    PutFile(kPhotoTaken, "");
     EXPECT_EQ(ServiceStatus(), "processing");
 }
 
 TEST_F(ServiceStatusTest, TheQueuesAreNotRead) {
     SetFolders({"/photos/trip"});
-    PutFile(kQueue, "malformed\n");
-    PutFile(kTaken, Event("/volume1/photos/other"));
+    PutFile(kPhotoQueue, "malformed\n");
+    PutFile(kPhotoTaken, Event("/volume1/photos/other"));
     Fault::Count(Call::Open);
     EXPECT_EQ(ServiceStatus(), "processing");
     for (const CallInfo &call : Fault::Log(Call::Open)) {
-        EXPECT_NE(call.path, kQueue);
-        EXPECT_NE(call.path, kTaken);
+        EXPECT_NE(call.path, kPhotoQueue);
+        EXPECT_NE(call.path, kPhotoTaken);
     }
     ExpectLog({});
 }
 
 TEST_F(ServiceStatusTest, OnlyARegularFileIsAQueue) {
     SetFolders({"/photos/trip"});
-    MakeDirs(kQueue);
+    MakeDirs(kPhotoQueue);
     PutFile("/volume2/target", kWaiting);
-    ASSERT_EQ(::symlink("/volume2/target", kTaken), 0);
+    ASSERT_EQ(::symlink("/volume2/target", kPhotoTaken), 0);
     EXPECT_EQ(ServiceStatus(), "finished");
 }
 
 TEST_F(ServiceStatusTest, AFolderThatCannotBeIndexedDoesNotCount) {
     SetFolders({"/photos/trip"});
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     platform.FindShare("photos")->encrypted = true;
     EXPECT_EQ(ServiceStatus(), "finished");
     EXPECT_EQ(platform.Calls("VANOEAMKDir"), 0U);
@@ -585,7 +584,7 @@ TEST_F(ServiceStatusTest, AFolderOfAGoneShareDoesNotCount) {
 }
 
 TEST_F(ServiceStatusTest, AFolderWithoutAShareNameFails) {
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     SetFolders({"", "/photos/trip"});
     EXPECT_EQ(ServiceStatus(), "failed");
     ExpectLog({"utils:389 GetShareNameByPath failed, path=",
@@ -595,7 +594,7 @@ TEST_F(ServiceStatusTest, AFolderWithoutAShareNameFails) {
 
 TEST_F(ServiceStatusTest, AnUnknownQueueLocationFails) {
     SetFolders({"/photos/trip"});
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     platform.Answer("VANOShareGet", {0, 0, 0, -1});
     EXPECT_EQ(ServiceStatus(), "failed");
     ExpectLog({"utils:772 VANOShareGet failed, name=photos, code=0",
@@ -637,7 +636,7 @@ TEST_F(ServiceStatusTest, ThePauseIsReadOnlyWhenWorkWaits) {
     PutFile(kStatusFile, R"({"resume_time":"0"})");
     EXPECT_EQ(ServiceStatus(), "finished");
     ExpectLog({});
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EXPECT_EQ(ServiceStatus(), "failed");
     ExpectLog({"status:66 json exception"});
 }
@@ -645,7 +644,7 @@ TEST_F(ServiceStatusTest, ThePauseIsReadOnlyWhenWorkWaits) {
 TEST_F(ServiceStatusTest, AnUnreadableStatusFileFailsWhenWorkWaits) {
     SetFolders({"/photos/trip"});
     PutFile(kStatusFile, "");
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EXPECT_EQ(ServiceStatus(), "failed");
     ExpectLog({"config:22 Failed to load json from /usr/vano/etc/fileindex/status.conf"});
     ExpectError(FILEINDEX_ERR_LOAD);
@@ -655,14 +654,14 @@ TEST_F(ServiceStatusTest, SharesOutOfSpaceAreNotMentioned) {
     SetFolders({"/photos/trip"});
     PutFile(kStatusFile, R"({"no_space":{"photos":true}})");
     EXPECT_EQ(ServiceStatus(), "finished");
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EXPECT_EQ(ServiceStatus(), "processing");
 }
 
 TEST_F(ServiceStatusTest, AnEndedPauseStaysInTheFile) {
     SetFolders({"/photos/trip"});
     SetResumeTime(kNow - 1);
-    PutFile(kQueue, kWaiting);
+    PutFile(kPhotoQueue, kWaiting);
     EventTrace::Get().Clear();
     EventTrace::Get().WatchFile(kStatusFile);
     Fault::Count(Call::Flock);
@@ -676,8 +675,8 @@ TEST_F(ServiceStatusTest, AnEndedPauseStaysInTheFile) {
 
 TEST_F(ServiceStatusTest, AskingTakesNoLock) {
     SetFolders({"/photos/trip"});
-    PutFile(kQueue, kWaiting);
-    const HoldLock queueLock(kQueue);
+    PutFile(kPhotoQueue, kWaiting);
+    const HoldLock queueLock(kPhotoQueue);
     const HoldLock statusLock(kStatusLock);
     const HoldLock folderLock(kFolderLock);
     EXPECT_EQ(ServiceStatus(), "processing");

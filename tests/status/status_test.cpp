@@ -246,10 +246,7 @@ TEST_F(StatusTest, TheFirstMarkNotifiesTheAdministrators) {
 
 TEST_F(StatusTest, TheNotificationComesBeforeTheMark) {
     bool markedBefore = true;
-    platform.On("VLIBCExecv", [&](const std::string &) -> std::optional<int> {
-        markedBefore = status.ShareIsNoSpace("a");
-        return std::nullopt;
-    });
+    platform.Before("VLIBCExecv", [&] { markedBefore = status.ShareIsNoSpace("a"); });
     (void)status.ShareSetNoSpace("a", true);
     EXPECT_EQ(platform.Calls("VLIBCExecv"), 1U);
     EXPECT_FALSE(markedBefore);

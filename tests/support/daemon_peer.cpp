@@ -10,6 +10,7 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include "support/appliance.h"
 #include "support/event_trace.h"
 #include "support/files.h"
 #include "support/sockets.h"
@@ -18,7 +19,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-constexpr char kSocketPath[] = "/var/run/fileindexd.sock";
 constexpr char kGarbage[] = "\xff{]garbage\n";
 
 // The peer that the event trace asks for news; there is one at a time.
@@ -55,7 +55,7 @@ struct DaemonPeer::Connection {
 
 DaemonPeer::DaemonPeer(Mode mode) : mode_(mode), listener_(-1), wake_(-1) {
     const KitScope kit;
-    listener_ = ListenAt(kSocketPath, SOCK_STREAM | SOCK_NONBLOCK);
+    listener_ = ListenAt(kDaemonSocket, SOCK_STREAM | SOCK_NONBLOCK);
     wake_ = ::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK);
     thread_ = std::thread(&DaemonPeer::Serve, this);
     static const bool registered = [] {
@@ -88,7 +88,7 @@ DaemonPeer::~DaemonPeer() {
     }
     ::close(listener_);
     ::close(wake_);
-    ::unlink(kSocketPath);
+    ::unlink(kDaemonSocket);
 }
 
 void DaemonPeer::Sync() {

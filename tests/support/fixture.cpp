@@ -6,28 +6,10 @@
 
 namespace VANO::TESTS {
 
-namespace {
-
-void EmptyDirectory(const std::string &path) {
-    MakeDirs(path);
-    for (const std::string &name : NamesIn(path)) {
-        RemoveTree(path + "/" + name);
-    }
-}
-
-} // namespace
-
 void LibraryTest::SetUp() {
     (void)SystemLog::Get();
     Fault::Reset();
-    EmptyDirectory("/usr/vano/etc");
-    EmptyDirectory("/usr/vano/bin");
-    EmptyDirectory("/volume1");
-    EmptyDirectory("/volume2");
-    MakeDirs(kSettingsDirectory);
-    for (const char *path : {kFolderLock, kStatusLock, kDaemonSocket}) {
-        RemoveTree(path);
-    }
+    EmptyAppliance();
     platform.Reset();
     LOG_LEVEL = 3;
     ErrorHandler::SetError(FILEINDEX_ERR_NONE);

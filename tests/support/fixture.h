@@ -29,6 +29,7 @@
 #include <fileindex/config.h>
 #include <fileindex/error_handler.h>
 
+#include "support/appliance.h"
 #include "support/daemon_peer.h"
 #include "support/event_trace.h"
 #include "support/fake_platform.h"
@@ -52,13 +53,6 @@ using ::testing::Not;
 using ::testing::SizeIs;
 using ::testing::StartsWith;
 using ::testing::UnorderedElementsAre;
-
-constexpr char kSettingsDirectory[] = "/usr/vano/etc/fileindex";
-constexpr char kFolderFile[] = "/usr/vano/etc/fileindex/folder.conf";
-constexpr char kFolderLock[] = "/tmp/fileidx_cfg_folder.lock";
-constexpr char kStatusFile[] = "/usr/vano/etc/fileindex/status.conf";
-constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
-constexpr char kDaemonSocket[] = "/var/run/fileindexd.sock";
 
 // Names the instances of a table-driven test by their rows' member `what`.
 struct RowName {

@@ -236,10 +236,7 @@ TEST_F(TestKitTest, TheNthCallFails) {
 }
 
 TEST_F(TestKitTest, AHookMayShortenAWrite) {
-    Fault::On(Call::Write, [](CallInfo &info) -> std::optional<long> {
-        info.size = 2;
-        return std::nullopt;
-    });
+    Fault::Before(Call::Write, [](CallInfo &info) { info.size = 2; });
     const int fd = ::open("/tmp/fault", O_CREAT | O_TRUNC | O_RDWR, 0600);
     EXPECT_EQ(::write(fd, "abcdef", 6), 2);
     ::close(fd);

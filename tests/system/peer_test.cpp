@@ -15,6 +15,7 @@
 #include <thread>
 #include <unistd.h>
 
+#include "support/appliance.h"
 #include "support/files.h"
 #include "support/sockets.h"
 #include "system/child.h"
@@ -28,11 +29,8 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
 
-constexpr char kSocket[] = "/run/fileindexd.sock";
-constexpr char kShares[] = "/usr/vano/etc/shares.json";
-constexpr char kStatus[] = "/usr/vano/etc/fileindex/status.conf";
-const std::string kQueue = "/volume1/photos/@eaDir/VANO@file_index_queue";
-const std::string kTaken = kQueue + ".tmp";
+const std::string kQueue = kPhotoQueue;
+const std::string kTaken = kPhotoTaken;
 const std::string kOut = "/tmp/peer.out";
 const std::string kErrors = "/tmp/peer.err";
 
@@ -64,7 +62,7 @@ std::vector<std::string> Lines() {
 
 class Connection {
   public:
-    Connection() : fd_(ConnectTo(kSocket)) { EXPECT_GE(fd_, 0); }
+    Connection() : fd_(ConnectTo(kDaemonSocket)) { EXPECT_GE(fd_, 0); }
     ~Connection() { ::close(fd_); }
     Connection(const Connection &) = delete;
     Connection &operator=(const Connection &) = delete;
@@ -86,15 +84,14 @@ class PeerTest : public ::testing::Test {
   protected:
     void SetUp() override {
         peer_.reset();
-        for (const std::string &path : {std::string(kSocket), std::string(kStatus), kOut, kErrors,
-                                        std::string("/volume1/photos")}) {
+        for (const std::string &path : {std::string(kDaemonSocket), std::string(kStatusFile), kOut,
+                                        kErrors, std::string("/volume1/photos")}) {
             RemoveTree(path);
         }
-        PutFile(kShares, R"({"photos":"/volume1/photos"})");
-        MakeDirs("/volume1/photos/@eaDir");
+        PutShares({{"photos", kPhotos}});
     }
 
-    void TearDown() override { RemoveTree(kSocket); }
+    void TearDown() override { RemoveTree(kDaemonSocket); }
 
     void Start(const std::vector<std::string> &arguments = {"--interval", "2"},
                const std::string &out = kOut) {
@@ -105,7 +102,7 @@ class PeerTest : public ::testing::Test {
 
     void StartAndWait() {
         Start();
-        ASSERT_TRUE(Eventually([] { return Exists(kSocket); }));
+        ASSERT_TRUE(Eventually([] { return Exists(kDaemonSocket); }));
     }
 
     int Stop(int signal = SIGTERM) {
@@ -254,7 +251,7 @@ TEST_F(PeerTest, AnEventThatCannotBePrintedStays) {
 }
 
 TEST_F(PeerTest, LeavesTheQueuesAloneWhilePaused) {
-    PutFile(kStatus, R"({"resume_time":0})");
+    PutFile(kStatusFile, R"({"resume_time":0})");
     PutFile(kQueue, EventLine(1));
     StartAndWait();
     std::this_thread::sleep_for(std::chrono::milliseconds(100));
@@ -392,30 +389,25 @@ TEST_F(PeerTest, RefusesToStartBesideALivingOne) {
 }
 
 TEST_F(PeerTest, RefusesToStartBesideAnotherKindOfDaemon) {
-    const int listener = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    std::strcpy(address.sun_path, kSocket);
-    ASSERT_EQ(::bind(listener, reinterpret_cast<const sockaddr *>(&address), sizeof(address)), 0);
-    ASSERT_EQ(::listen(listener, 5), 0);
+    const int listener = ListenAt(kDaemonSocket);
     const Outcome outcome = RunToEnd({PEER_PATH});
     EXPECT_EQ(outcome.status, 1);
     EXPECT_THAT(outcome.error, HasSubstr("another daemon listens"));
-    EXPECT_TRUE(Exists(kSocket));
+    EXPECT_TRUE(Exists(kDaemonSocket));
     ::close(listener);
 }
 
 TEST_F(PeerTest, LeavesAFileInTheSocketsPlaceAlone) {
-    PutFile(kSocket, "precious");
+    PutFile(kDaemonSocket, "precious");
     const Outcome outcome = RunToEnd({PEER_PATH});
     EXPECT_EQ(outcome.status, 1);
-    EXPECT_EQ(ReadText(kSocket), "precious");
+    EXPECT_EQ(ReadText(kDaemonSocket), "precious");
 }
 
 TEST_F(PeerTest, TakesThePlaceOfADeadOne) {
     StartAndWait();
     EXPECT_EQ(Stop(SIGKILL), 128 + SIGKILL);
-    ASSERT_TRUE(Exists(kSocket));
+    ASSERT_TRUE(Exists(kDaemonSocket));
     PutFile(kQueue, EventLine(1));
     Start();
     EXPECT_TRUE(Eventually([] { return !Events().empty(); })); // it listens before it works
@@ -427,7 +419,7 @@ TEST_F(PeerTest, EndsCleanlyAtEitherSignal) {
     for (const int signal : {SIGTERM, SIGINT}) {
         StartAndWait();
         EXPECT_EQ(Stop(signal), 0);
-        EXPECT_FALSE(Exists(kSocket));
+        EXPECT_FALSE(Exists(kDaemonSocket));
     }
 }
 

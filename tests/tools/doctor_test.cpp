@@ -16,8 +16,8 @@
 #include <unistd.h>
 
 #include "platform/fuse_server.h"
-#include "support/mounts.h"
 #include "support/files.h"
+#include "support/mounts.h"
 #include "system/child.h"
 #include "tools/ctl.h"
 

@@ -5,9 +5,9 @@
 #include <gtest/gtest.h>
 #include <iostream>
 
-#include "machine.h"
 #include "parts.h"
 #include "support/files.h"
+#include "testbed.h"
 #include "tracer.h"
 
 namespace {
@@ -47,7 +47,7 @@ int Run(const std::vector<const Part *> &parts, const Options &options) {
         if (part->traces && !CanTrace()) {
             return Skip("this machine lets no system call be traced");
         }
-        const Machine machine(STAND_IN_PATH, part->hasDaemon);
+        const Testbed testbed(STAND_IN_PATH, part->hasDaemon);
         failures += part->run(options);
     }
     return failures == 0 ? 0 : 1;

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "machine.h"
+#include "testbed.h"
 
 namespace VANO::TORTURE {
 

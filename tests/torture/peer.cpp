@@ -2,9 +2,9 @@
 
 #include <algorithm>
 
-#include "machine.h"
 #include "queue_worker.h"
 #include "support/files.h"
+#include "testbed.h"
 
 namespace VANO::TORTURE {
 
@@ -15,7 +15,7 @@ std::string LineOf(const peer::Event &event) {
     line["event"] = event.code;
     line["path"] = event.path;
     line["data"] = event.data;
-    return TESTS::CompactText(line);
+    return CompactText(line);
 }
 
 } // namespace
@@ -27,7 +27,7 @@ std::string WorkOffQueues(std::vector<QueuedEvent> &handled) {
             return true;
         },
         [](const std::string &, const std::string &) { return true; }};
-    for (const Share &share : kShares) {
+    for (const std::string &share : kShares) {
         const std::string queue = QueueOf(share);
         std::string reason;
         while (peer::WorkOffQueue(queue, handlers, reason) == peer::QueueResult::kDone) {
@@ -35,7 +35,7 @@ std::string WorkOffQueues(std::vector<QueuedEvent> &handled) {
         if (!reason.empty()) {
             return "the peer says: " + reason;
         }
-        if (TESTS::Exists(queue) || TESTS::Exists(queue + ".tmp")) {
+        if (Exists(queue) || Exists(TakenOf(share))) {
             return "the peer leaves " + queue;
         }
     }

@@ -26,11 +26,11 @@
 #include <unistd.h>
 
 #include "log_notes.h"
-#include "machine.h"
 #include "parts.h"
 #include "support/files.h"
 #include "system/child.h"
 #include "tally.h"
+#include "testbed.h"
 #include "tracer.h"
 
 namespace VANO::TORTURE {
@@ -38,7 +38,6 @@ namespace VANO::TORTURE {
 namespace {
 
 using namespace FILEINDEX;
-using namespace TESTS;
 using Clock = std::chrono::steady_clock;
 
 constexpr int kEventCode = 7; // no code of the library's own: nothing else appends it
@@ -354,8 +353,8 @@ std::map<std::string, int> EventsOfPeer(const std::string &output) {
 }
 
 void Check(Tally &tally, const Results &results, const std::string &peerOutput) {
-    const Json::Value folders = ReadJson(kFolderConf);
-    const Json::Value marks = ReadJson(kStatusConf)["need_reindex"];
+    const Json::Value folders = ReadJson(kFolderFile);
+    const Json::Value marks = ReadJson(kStatusFile)["need_reindex"];
     CheckOwned(tally, "folder", results.folders, [&](const std::string &path) {
         return folders.isMember(path) ? folders[path]["name"].asString() : "-";
     });
@@ -373,23 +372,21 @@ void Check(Tally &tally, const Results &results, const std::string &peerOutput) 
 
 // Each share has a folder that stays: with its last folder a share loses its queue.
 void Arrange(int processes) {
-    std::string table;
+    std::map<std::string, std::string> shares;
     Json::Value folders(Json::objectValue);
     for (int process = 0; process < processes; ++process) {
-        table += (table.empty() ? "{\"" : ",\"") + ShareName(process) + "\":\"" +
-                 ShareDirectory(process) + "\"";
-        MakeDirs(ShareDirectory(process) + "/keep");
+        shares[ShareName(process)] = ShareDirectory(process);
         folders["/" + ShareName(process) + "/keep"]["name"] = "keep";
     }
-    PutFile("/usr/vano/etc/shares.json", table + "}");
-    PutFile(kFolderConf, CompactText(folders));
-    PutFile(kStatusConf, "{}");
+    PutShares(shares, {"keep"});
+    PutFile(kFolderFile, CompactText(folders));
+    PutFile(kStatusFile, "{}");
 }
 
 bool AreQueuesEmpty(int processes) {
     for (int process = 0; process < processes; ++process) {
-        const std::string queue = ShareDirectory(process) + "/@eaDir/" + kQueueName;
-        if (Exists(queue) || Exists(queue + ".tmp")) {
+        const std::string share = ShareDirectory(process);
+        if (Exists(QueueOf(share)) || Exists(TakenOf(share))) {
             return false;
         }
     }
@@ -403,7 +400,7 @@ long Stress(const Options &options) {
     Arrange(options.processes);
     const std::string out = "/tmp/peer.out";
     Child peer({PEER_PATH, "--interval", "5"}, out, "/tmp/peer.err");
-    if (!Eventually([] { return Exists("/run/fileindexd.sock"); })) {
+    if (!Eventually([] { return Exists(kDaemonSocket); })) {
         throw std::runtime_error("the peer does not start: " + ReadText("/tmp/peer.err"));
     }
     std::vector<pid_t> processes;

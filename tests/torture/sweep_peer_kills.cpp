@@ -14,8 +14,6 @@ namespace VANO::TORTURE {
 
 namespace {
 
-using namespace TESTS;
-
 constexpr char kHandled[] = "/run/torture.handled";
 constexpr std::chrono::seconds kLimit{20};
 constexpr int kEvents = 3;
@@ -25,16 +23,12 @@ const std::string &Queue() {
     return queue;
 }
 
-std::string EventLine(int number) {
-    return R"({"data":null,"event":2,"path":"/)" + std::to_string(number) + "\"}\n";
-}
-
 // Events 0 to 2 wait; those that a dead peer had taken over come first.
 void Arrange(int takenOver) {
     std::string taken;
     std::string waiting;
     for (int number = 0; number < kEvents; ++number) {
-        (number < takenOver ? taken : waiting) += EventLine(number);
+        (number < takenOver ? taken : waiting) += EventLine("/" + std::to_string(number));
     }
     PutFile(kHandled, "");
     RemoveTree(Queue() + ".tmp");
@@ -109,7 +103,7 @@ int CountCalls(int takenOver) {
 
 long SweepPeerKills(const Options &) {
     Tally tally("peer-kills");
-    MakeDirs(kShares.front().directory + std::string("/@eaDir"));
+    MakeDirs(kShares.front() + "/@eaDir");
     for (const int takenOver : {0, 1, kEvents}) {
         const int calls = CountCalls(takenOver);
         for (int index = 0; index < calls; ++index) {

@@ -359,7 +359,7 @@ long SweepPowerLoss(const Options &options) {
         const Trial trial(operation);
         const Recorder record = Record(trial);
         steps += static_cast<long>(record.steps.size());
-        for (const std::string path : {kFolderConf, kStatusConf}) {
+        for (const std::string path : {kFolderFile, kStatusFile}) {
             const Judgement judgement =
                 Judge(record, record.steps, path, trial.Before(), trial.After());
             states += judgement.states;

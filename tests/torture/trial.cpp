@@ -68,12 +68,12 @@ std::string CheckDescriptors(const Descriptors &before, int lockFailures) {
 
 std::string CheckLocks() {
     std::vector<std::string> files{kFolderLock, kStatusLock};
-    for (const Share &share : kShares) {
+    for (const std::string &share : kShares) {
         files.push_back(QueueOf(share));
     }
     std::string complaints;
     for (const std::string &file : files) {
-        if (TESTS::IsLocked(file)) {
+        if (IsLocked(file)) {
             Complain(complaints, "still locked: " + file);
         }
     }
@@ -164,10 +164,10 @@ class StateCheck {
     }
 
     std::string CheckFile(const std::string &path, const FileStates &states, bool mustBeNew) const {
-        if (states.before == nullptr && states.after == nullptr && path != kStatusConf) {
+        if (states.before == nullptr && states.after == nullptr && path != kStatusFile) {
             return strays_ ? "" : "is left over";
         }
-        const bool marked = marks_ && path == kStatusConf;
+        const bool marked = marks_ && path == kStatusFile;
         const auto same = marked ? IsSameBut : IsSame;
         const bool mayBeOld = !mustBeNew || (states.after == nullptr && IsIndexData(path));
         if (same(states.now, states.after) || (mayBeOld && same(states.now, states.before))) {
@@ -211,7 +211,7 @@ std::string FollowUp(const Operation &operation, const StateCheck &check) {
     } catch (const std::exception &exception) {
         return std::string("the next operation throws ") + exception.what();
     }
-    const std::string complaint = check.NewState(Machine::Look(), false);
+    const std::string complaint = check.NewState(Testbed::Look(), false);
     return complaint.empty() ? "" : "after the next operation: " + complaint;
 }
 
@@ -264,11 +264,11 @@ void Trial::RunAndJudge(Report &report, const Disturbance &disturbance,
 std::string Trial::Judge(const Report &report, const Disturbance &disturbance) const {
     const bool done = !report.threw && report.result == Result::kDone;
     const StateCheck check(before_, after_, operation_.queuesEvents && !done, disturbance.removal);
-    const Snapshot now = Machine::Look();
+    const Snapshot now = Testbed::Look();
     Snapshot judged = now;
     if (done && operation_.mayLeaveStatus &&
-        IsSame(Find(now, kStatusConf), Find(before_, kStatusConf))) {
-        judged[kStatusConf] = after_.at(kStatusConf);
+        IsSame(Find(now, kStatusFile), Find(before_, kStatusFile))) {
+        judged[kStatusFile] = after_.at(kStatusFile);
     }
     const bool queues = !disturbance.queue && !operation_.mayLackEvents;
     const std::string state = done ? check.NewState(judged, queues) : check.EitherState(judged);
@@ -282,8 +282,8 @@ std::string Trial::Judge(const Report &report, const Disturbance &disturbance) c
 }
 
 Trial::Trial(const Operation &operation) : operation_(operation) {
-    Machine::Reset(operation.start);
-    before_ = Machine::Look();
+    Testbed::Reset(operation.start);
+    before_ = Testbed::Look();
     const auto body = [&] {
         try {
             ::_exit(operation_.run() == Result::kDone ? 0 : 1);
@@ -292,29 +292,29 @@ Trial::Trial(const Operation &operation) : operation_(operation) {
         }
     };
     const Ending ending = RunForked(body, kLimit);
-    after_ = Machine::Look();
+    after_ = Testbed::Look();
     if (ending.hung || ending.status != 0) {
         throw std::runtime_error(std::string(operation.name) + " fails undisturbed");
     }
 }
 
 std::string Trial::Run(const Hooks &hooks, const Shared<Disturbance> &disturbance) const {
-    Machine::Reset(operation_.start);
+    Testbed::Reset(operation_.start);
     const Shared<Report> report;
     const auto body = [&] { RunAndJudge(*report, *disturbance, WatchBegins, WatchEnds); };
     const Ending ending = RunTraced(body, hooks, kLimit);
     return CheckEnding(ending, report->finished, report->complaint);
 }
 
-std::string Trial::Run(const TESTS::MemoryFault &fault, long &requests) const {
-    Machine::Reset(operation_.start);
+std::string Trial::Run(const MemoryFault &fault, long &requests) const {
+    Testbed::Reset(operation_.start);
     const Shared<Report> report;
     Disturbance disturbance;
     disturbance.memory = true;
     const auto body = [&] {
         RunAndJudge(
-            *report, disturbance, [&] { TESTS::ArmMemoryFault(fault); },
-            [&] { report->requests = TESTS::DisarmMemoryFault(); });
+            *report, disturbance, [&] { ArmMemoryFault(fault); },
+            [&] { report->requests = DisarmMemoryFault(); });
     };
     const Ending ending = RunForked(body, kLimit);
     requests = report->requests;
@@ -322,7 +322,7 @@ std::string Trial::Run(const TESTS::MemoryFault &fault, long &requests) const {
 }
 
 std::string Trial::RunKilled(const Hooks &hooks, const std::vector<QueuedEvent> &appended) const {
-    Machine::Reset(operation_.start);
+    Testbed::Reset(operation_.start);
     const auto killed = [&] {
         WatchBegins();
         (void)operation_.run();
@@ -335,7 +335,7 @@ std::string Trial::RunKilled(const Hooks &hooks, const std::vector<QueuedEvent> 
     const StateCheck check(before_, after_, operation_.queuesEvents, true);
     const Shared<Report> report;
     const auto next = [&] {
-        const std::string state = Join({CheckLocks(), check.EitherState(Machine::Look())});
+        const std::string state = Join({CheckLocks(), check.EitherState(Testbed::Look())});
         const std::string followUp = FollowUp(operation_, check);
         const std::string complaint = Join({state, followUp, CheckPeer(ExpectedOfPeer(appended))});
         std::snprintf(report->complaint, sizeof(report->complaint), "%s", complaint.c_str());
@@ -348,7 +348,7 @@ std::string Trial::RunKilled(const Hooks &hooks, const std::vector<QueuedEvent> 
 // What waited before and what was appended, but for the queues that the operation removes.
 std::vector<QueuedEvent> Trial::ExpectedOfPeer(const std::vector<QueuedEvent> &appended) const {
     std::vector<QueuedEvent> expected = appended;
-    for (const Share &share : kShares) {
+    for (const std::string &share : kShares) {
         for (const std::string &event : EventsAtStart(share)) {
             expected.push_back({QueueOf(share), event});
         }

@@ -159,10 +159,9 @@ TEST_F(DaemonSocketTest, TheSendTimeoutIsOneSecondWhileConnectingAndWriting) {
     Fault::Record(Call::Setsockopt);
     Fault::Record(Call::Signal);
     timeval timeout{};
-    Fault::On(Call::Write, [&](CallInfo &info) -> std::optional<long> {
+    Fault::Before(Call::Write, [&](CallInfo &info) {
         socklen_t size = sizeof(timeout);
         EXPECT_EQ(::getsockopt(info.fd, SOL_SOCKET, SO_SNDTIMEO, &timeout, &size), 0);
-        return std::nullopt;
     });
     EXPECT_TRUE(SendText(100));
     EXPECT_EQ(timeout.tv_sec, 1);
@@ -294,10 +293,7 @@ TEST_F(DaemonSocketTest, ALongCommandArrivesWhole) {
 
 TEST_F(DaemonSocketTest, ShortWritesAreContinued) {
     DaemonPeer daemon;
-    Fault::On(Call::Write, [](CallInfo &info) -> std::optional<long> {
-        info.size = 1;
-        return std::nullopt;
-    });
+    Fault::Before(Call::Write, [](CallInfo &info) { info.size = 1; });
     EXPECT_TRUE(SendText(1500));
     ASSERT_EQ(daemon.Messages().size(), 1U);
     EXPECT_EQ(daemon.Messages()[0]["data"], PaddingFor(1500));

@@ -22,15 +22,11 @@ namespace VANO::TESTS {
 namespace {
 
 constexpr char kTrip[] = "/volume1/photos/trip";
-constexpr char kQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";
-constexpr char kTaken[] = "/volume1/photos/@eaDir/VANO@file_index_queue.tmp";
 constexpr char kTripLine[] = R"({"data":{},"event":131072,"path":"/volume1/photos/trip"})"
                              "\n";
-constexpr int kReindex = 65536;
-constexpr int kSettingChanged = 131072;
 
 bool AddTrip() {
-    return AddCustomEvent(kSettingChanged, kTrip, Json::Value(Json::objectValue));
+    return AddCustomEvent(kSettingEvent, kTrip, Json::Value(Json::objectValue));
 }
 
 class EventQueueTest : public LibraryTest {
@@ -54,7 +50,7 @@ class EventQueueTest : public LibraryTest {
     // The lock on the queue fails that often; the status file's is left alone.
     static void FailQueueLock(int times, int error) {
         Fault::On(Call::Flock, [times, error](CallInfo &info) mutable -> std::optional<long> {
-            if (info.path != kQueue || (info.number & LOCK_EX) == 0 || times-- <= 0) {
+            if (info.path != kPhotoQueue || (info.number & LOCK_EX) == 0 || times-- <= 0) {
                 return std::nullopt;
             }
             errno = error;
@@ -65,7 +61,7 @@ class EventQueueTest : public LibraryTest {
     static std::size_t QueueCalls(Call call) {
         std::size_t calls = 0;
         for (const CallInfo &info : Fault::Log(call)) {
-            calls += info.path == kQueue ? 1 : 0;
+            calls += info.path == kPhotoQueue ? 1 : 0;
         }
         return calls;
     }
@@ -75,13 +71,13 @@ class EventQueueTest : public LibraryTest {
 
 TEST_F(EventQueueTest, AppendsOneLineOfJson) {
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kQueue), kTripLine);
-    EXPECT_TRUE(AddCustomEvent(kReindex, "/volume1/photos/x", Json(R"({"a":[1,null]})")));
-    EXPECT_EQ(ReadText(kQueue),
+    EXPECT_EQ(ReadText(kPhotoQueue), kTripLine);
+    EXPECT_TRUE(AddCustomEvent(kReindexEvent, "/volume1/photos/x", Json(R"({"a":[1,null]})")));
+    EXPECT_EQ(ReadText(kPhotoQueue),
               std::string(kTripLine) +
                   R"({"data":{"a":[1,null]},"event":65536,"path":"/volume1/photos/x"})"
                   "\n");
-    EXPECT_FALSE(Exists(kTaken));
+    EXPECT_FALSE(Exists(kPhotoTaken));
     ExpectNoMark();
     ExpectLog({});
     ExpectError(FILEINDEX_ERR_NONE);
@@ -90,13 +86,13 @@ TEST_F(EventQueueTest, AppendsOneLineOfJson) {
 TEST_F(EventQueueTest, AnyEventIsOneLineThatReadsBack) {
     const std::string paths[] = {"/volume1/photos", "/volume1/photos/a \"b\"\\\nc",
                                  "/volume1/photos/gr\xc3\xbc\xc3\x9f", "/volume1/photos/\xff\xfe"};
-    for (const int event : {0, 1, -1, INT_MIN, INT_MAX, kSettingChanged}) {
+    for (const int event : {0, 1, -1, INT_MIN, INT_MAX, kSettingEvent}) {
         for (const std::string &path : paths) {
             for (const char *data :
                  {"null", "{}", "[]", "\"a\\nb\"", "-5", "{\"\xff\":\"\xfe\"}"}) {
-                RemoveTree(kQueue);
+                RemoveTree(kPhotoQueue);
                 EXPECT_TRUE(AddCustomEvent(event, path, Json(data)));
-                const std::string text = ReadText(kQueue);
+                const std::string text = ReadText(kPhotoQueue);
                 EXPECT_EQ(text.find('\n'), text.size() - 1) << text;
                 const Json::Value line = Json(text);
                 EXPECT_THAT(line.getMemberNames(), ElementsAre("data", "event", "path"));
@@ -109,27 +105,27 @@ TEST_F(EventQueueTest, AnyEventIsOneLineThatReadsBack) {
 }
 
 TEST_F(EventQueueTest, WhatIsThereStays) {
-    PutFile(kQueue, "not an event\n{\"half\":");
+    PutFile(kPhotoQueue, "not an event\n{\"half\":");
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kQueue), std::string("not an event\n{\"half\":") + kTripLine);
+    EXPECT_EQ(ReadText(kPhotoQueue), std::string("not an event\n{\"half\":") + kTripLine);
     ExpectLog({});
 }
 
 TEST_F(EventQueueTest, ANewQueueHasTheModeThatTheUmaskLeaves) {
     for (const mode_t mask : {022U, 0U, 077U}) {
-        RemoveTree(kQueue);
+        RemoveTree(kPhotoQueue);
         const mode_t old = ::umask(mask);
         EXPECT_TRUE(AddTrip());
         ::umask(old);
-        EXPECT_EQ(ModeOf(kQueue), 0666U & ~mask);
+        EXPECT_EQ(ModeOf(kPhotoQueue), 0666U & ~mask);
     }
 }
 
 TEST_F(EventQueueTest, TheModeOfAnExistingQueueStays) {
-    PutFile(kQueue, "");
-    ASSERT_EQ(::chmod(kQueue, 0600), 0);
+    PutFile(kPhotoQueue, "");
+    ASSERT_EQ(::chmod(kPhotoQueue, 0600), 0);
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ModeOf(kQueue), 0600U);
+    EXPECT_EQ(ModeOf(kPhotoQueue), 0600U);
 }
 
 TEST_F(EventQueueTest, WritesOnceUnderTheLock) {
@@ -138,7 +134,7 @@ TEST_F(EventQueueTest, WritesOnceUnderTheLock) {
     Fault::Record(Call::Write);
     Fault::Record(Call::Close);
     EXPECT_TRUE(AddTrip());
-    const std::string queue = kQueue;
+    const std::string queue = kPhotoQueue;
     EXPECT_THAT(
         platform.Trace(),
         ElementsAre("VANOShareNamePathGet(/volume1/photos/trip, 492, 4096)", "VANOShareGet(photos)",
@@ -159,14 +155,14 @@ TEST_F(EventQueueTest, WritesOnceUnderTheLock) {
 TEST_F(EventQueueTest, TheMetadataDirectoryIsMadeFirst) {
     RemoveTree("/volume1/photos/@eaDir");
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kQueue), kTripLine);
+    EXPECT_EQ(ReadText(kPhotoQueue), kTripLine);
 }
 
 TEST_F(EventQueueTest, TheQueueBelongsToTheShareOfThePath) {
     platform.AddShare("video", "/volume2/video");
-    EXPECT_TRUE(AddCustomEvent(kSettingChanged, "/volume2/video/x", Json("{}")));
+    EXPECT_TRUE(AddCustomEvent(kSettingEvent, "/volume2/video/x", Json("{}")));
     EXPECT_TRUE(Exists("/volume2/video/@eaDir/VANO@file_index_queue"));
-    EXPECT_FALSE(Exists(kQueue));
+    EXPECT_FALSE(Exists(kPhotoQueue));
 }
 
 // --- a pending re-index ---------------------------------------------------------------------
@@ -219,12 +215,12 @@ const std::vector<PendingRow> &PendingRows() {
 
 TEST_F(EventQueueTest, APendingReindexOfThePathCoversAnyEvent) {
     for (const PendingRow &row : PendingRows()) {
-        for (const int event : {kReindex, kSettingChanged, 0, -1}) {
+        for (const int event : {kReindexEvent, kSettingEvent, 0, -1}) {
             for (const std::string &text :
                  {row.line, row.line + "\n", "\nmalformed\n" + row.line + "\nlast\n"}) {
-                PutFile(kQueue, text);
+                PutFile(kPhotoQueue, text);
                 EXPECT_TRUE(AddCustomEvent(event, kTrip, Json("{}")));
-                EXPECT_EQ(ReadText(kQueue) == text, row.covers) << text;
+                EXPECT_EQ(ReadText(kPhotoQueue) == text, row.covers) << text;
             }
         }
     }
@@ -233,38 +229,38 @@ TEST_F(EventQueueTest, APendingReindexOfThePathCoversAnyEvent) {
 
 TEST_F(EventQueueTest, APendingReindexInTheTakenOverQueueCoversToo) {
     for (const PendingRow &row : PendingRows()) {
-        RemoveTree(kQueue);
-        PutFile(kTaken, row.line + "\n");
+        RemoveTree(kPhotoQueue);
+        PutFile(kPhotoTaken, row.line + "\n");
         EXPECT_TRUE(AddTrip());
-        EXPECT_EQ(Exists(kQueue), !row.covers) << row.line;
-        EXPECT_EQ(ReadText(kTaken), row.line + "\n") << "belongs to the daemon";
+        EXPECT_EQ(Exists(kPhotoQueue), !row.covers) << row.line;
+        EXPECT_EQ(ReadText(kPhotoTaken), row.line + "\n") << "belongs to the daemon";
     }
     ExpectLog({});
     ExpectNoMark();
 }
 
 TEST_F(EventQueueTest, AFoundReindexSparesTheTakenOverQueue) {
-    PutFile(kQueue, PendingRows()[0].line + "\n");
-    PutFile(kTaken, "");
+    PutFile(kPhotoQueue, PendingRows()[0].line + "\n");
+    PutFile(kPhotoTaken, "");
     Fault::Count(Call::Open);
     EXPECT_TRUE(AddTrip());
     ASSERT_EQ(Fault::Calls(Call::Open), 1U);
-    EXPECT_EQ(Fault::Log(Call::Open)[0].path, kQueue);
+    EXPECT_EQ(Fault::Log(Call::Open)[0].path, kPhotoQueue);
 }
 
 TEST_F(EventQueueTest, APathOfOtherBytesIsAnotherPath) {
-    EXPECT_TRUE(AddCustomEvent(kReindex, "/volume1/photos/\xff", Json("{}")));
-    const std::string text = ReadText(kQueue);
-    EXPECT_TRUE(AddCustomEvent(kSettingChanged, "/volume1/photos/\xff", Json("{}")));
-    EXPECT_EQ(ReadText(kQueue), text);
-    EXPECT_TRUE(AddCustomEvent(kSettingChanged, "/volume1/photos/\xfe", Json("{}")));
-    EXPECT_NE(ReadText(kQueue), text);
+    EXPECT_TRUE(AddCustomEvent(kReindexEvent, "/volume1/photos/\xff", Json("{}")));
+    const std::string text = ReadText(kPhotoQueue);
+    EXPECT_TRUE(AddCustomEvent(kSettingEvent, "/volume1/photos/\xff", Json("{}")));
+    EXPECT_EQ(ReadText(kPhotoQueue), text);
+    EXPECT_TRUE(AddCustomEvent(kSettingEvent, "/volume1/photos/\xfe", Json("{}")));
+    EXPECT_NE(ReadText(kPhotoQueue), text);
 }
 
 TEST_F(EventQueueTest, AQueueThatCannotBeReadIsLoggedAndAppendedTo) {
     const std::string covered = PendingRows()[0].line + "\n";
-    for (const std::string queue : {kQueue, kTaken}) {
-        RemoveTree(kQueue);
+    for (const std::string queue : {kPhotoQueue, kPhotoTaken}) {
+        RemoveTree(kPhotoQueue);
         PutFile(queue, covered);
         Fault::On(Call::Open, [queue](CallInfo &info) -> std::optional<long> {
             if (info.path != queue || (info.number & O_ACCMODE) != O_RDONLY) {
@@ -275,7 +271,7 @@ TEST_F(EventQueueTest, AQueueThatCannotBeReadIsLoggedAndAppendedTo) {
         });
         EXPECT_TRUE(AddTrip());
         ExpectLog({"utils:95 Failed to open queue=" + queue + ", reason=Permission denied"});
-        EXPECT_EQ(ReadText(kQueue), queue == kQueue ? covered + kTripLine : kTripLine);
+        EXPECT_EQ(ReadText(kPhotoQueue), queue == kPhotoQueue ? covered + kTripLine : kTripLine);
         Fault::Reset();
         RemoveTree(queue);
     }
@@ -287,7 +283,7 @@ TEST_F(EventQueueTest, AQueueThatCannotBeReadIsLoggedAndAppendedTo) {
 TEST_F(EventQueueTest, APathOutsideAnyShareMarksTheEmptyShare) {
     for (const std::string path : {"/elsewhere/trip", "", "/volume1", "/volume1/photos2/a"}) {
         RemoveTree(kStatusFile);
-        EXPECT_FALSE(AddCustomEvent(kSettingChanged, path, Json("{}")));
+        EXPECT_FALSE(AddCustomEvent(kSettingEvent, path, Json("{}")));
         ExpectLog({"utils:472 VANOShareNamePathGet failed, path=" + path});
         ExpectMark("");
     }
@@ -301,7 +297,7 @@ TEST_F(EventQueueTest, AnUnknownQueueLocationMarksTheShare) {
     ExpectLog({"utils:772 VANOShareGet failed, name=photos, code=0",
                "utils:478 FILEIDXQueuePathGet failed, share=photos"});
     ExpectMark("photos");
-    EXPECT_FALSE(Exists(kQueue));
+    EXPECT_FALSE(Exists(kPhotoQueue));
 }
 
 TEST_F(EventQueueTest, AQueueThatCannotBeOpenedMarksTheShareWithoutAMessage) {
@@ -316,7 +312,7 @@ TEST_F(EventQueueTest, AQueueThatCannotBeOpenedMarksTheShareWithoutAMessage) {
         ExpectMark("photos");
         ExpectLog({});
     }
-    EXPECT_FALSE(Exists(kQueue));
+    EXPECT_FALSE(Exists(kPhotoQueue));
 }
 
 TEST_F(EventQueueTest, AMissingMetadataDirectoryMarksTheShare) {
@@ -366,7 +362,7 @@ TEST_F(EventQueueTest, ALongShareNameIsKeptWhole) {
     const std::string name(255, 's'); // as long as a directory's name can be
     platform.AddShare(name, "/volume1/" + name);
     platform.Answer("VANOShareGet", {-1});
-    EXPECT_FALSE(AddCustomEvent(kSettingChanged, "/volume1/" + name + "/x", Json("{}")));
+    EXPECT_FALSE(AddCustomEvent(kSettingEvent, "/volume1/" + name + "/x", Json("{}")));
     (void)SystemLog::Get().Lines();
     ExpectMark(name);
 }
@@ -375,7 +371,7 @@ TEST_F(EventQueueTest, ALongShareNameIsKeptWhole) {
 
 TEST_F(EventQueueTest, ABusyLockIsTriedAgainAfterAPause) {
     for (const int error : {EAGAIN, EINTR}) {
-        RemoveTree(kQueue);
+        RemoveTree(kPhotoQueue);
         Fault::Reset();
         FailQueueLock(2, error);
         Fault::Return(Call::Rand, {1234567, 29});
@@ -383,7 +379,7 @@ TEST_F(EventQueueTest, ABusyLockIsTriedAgainAfterAPause) {
         Fault::Count(Call::Open);
         LOG_LEVEL = 7;
         EXPECT_TRUE(AddTrip());
-        EXPECT_EQ(ReadText(kQueue), kTripLine);
+        EXPECT_EQ(ReadText(kPhotoQueue), kTripLine);
         EXPECT_EQ(QueueCalls(Call::Open), 3U) << "opened afresh for each attempt";
         ASSERT_EQ(Fault::Calls(Call::Usleep), 2U);
         EXPECT_EQ(Fault::Log(Call::Usleep)[0].number, 7000);
@@ -400,7 +396,7 @@ TEST_F(EventQueueTest, NothingIsHeldDuringThePause) {
         for (const std::string &fd : NamesIn("/proc/self/fd")) {
             std::error_code error;
             const auto target = std::filesystem::read_symlink("/proc/self/fd/" + fd, error);
-            if (target == kQueue) {
+            if (target == kPhotoQueue) {
                 held.push_back(fd);
             }
         }
@@ -412,12 +408,12 @@ TEST_F(EventQueueTest, NothingIsHeldDuringThePause) {
 }
 
 TEST_F(EventQueueTest, ThreeBusyLocksDropTheEvent) {
-    PutFile(kQueue, "before\n");
-    const HoldLock lock(kQueue);
+    PutFile(kPhotoQueue, "before\n");
+    const HoldLock lock(kPhotoQueue);
     Fault::Quiet(Call::Usleep);
     Fault::Count(Call::Flock);
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kQueue), "before\n");
+    EXPECT_EQ(ReadText(kPhotoQueue), "before\n");
     EXPECT_EQ(Fault::Calls(Call::Flock), 3U);
     EXPECT_EQ(Fault::Calls(Call::Usleep), 3U) << "after the third too";
     for (const CallInfo &call : Fault::Log(Call::Usleep)) {
@@ -431,16 +427,16 @@ TEST_F(EventQueueTest, ThreeBusyLocksDropTheEvent) {
 }
 
 TEST_F(EventQueueTest, ASharedLockIsBusyToo) {
-    PutFile(kQueue, "");
-    const HoldLock lock(kQueue, false);
+    PutFile(kPhotoQueue, "");
+    const HoldLock lock(kPhotoQueue, false);
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kQueue), "");
+    EXPECT_EQ(ReadText(kPhotoQueue), "");
     ExpectNoMark();
 }
 
 TEST_F(EventQueueTest, TheLockIsFreeAfterwards) {
     EXPECT_TRUE(AddTrip());
-    EXPECT_FALSE(IsLocked(kQueue));
+    EXPECT_FALSE(IsLocked(kPhotoQueue));
 }
 
 TEST_F(EventQueueTest, TheDropIsToldAfterTheLastPause) {
@@ -449,8 +445,8 @@ TEST_F(EventQueueTest, TheDropIsToldAfterTheLastPause) {
     Fault::Record(Call::Usleep);
     Fault::Return(Call::Rand, {0, 1, 2});
     FailQueueLock(3, EAGAIN);
-    const std::string message = std::string("utils:516 try lock too many times, path=") + kQueue +
-                                ", reason=Resource temporarily unavailable";
+    const std::string message = std::string("utils:516 try lock too many times, path=") +
+                                kPhotoQueue + ", reason=Resource temporarily unavailable";
     EXPECT_TRUE(AddTrip());
     EXPECT_THAT(Effects(), ElementsAre("VANOEAMKDir(0, /volume1/photos/@eaDir)", "usleep(0)",
                                        "usleep(1000)", "usleep(2000)", "log: " + message));
@@ -467,7 +463,7 @@ TEST_F(EventQueueTest, TheReasonOfTheDropIsTheLastLocks) {
         return -1;
     });
     EXPECT_TRUE(AddTrip());
-    ExpectLog({std::string("utils:516 try lock too many times, path=") + kQueue +
+    ExpectLog({std::string("utils:516 try lock too many times, path=") + kPhotoQueue +
                ", reason=Interrupted system call"});
 }
 
@@ -476,14 +472,14 @@ TEST_F(EventQueueTest, AnotherLockErrorMarksTheShareAtOnce) {
     FailQueueLock(1, ENOLCK);
     EXPECT_FALSE(AddTrip());
     EXPECT_EQ(Fault::Calls(Call::Usleep), 0U);
-    EXPECT_EQ(ReadText(kQueue), "");
+    EXPECT_EQ(ReadText(kPhotoQueue), "");
     ExpectMark("photos");
     ExpectLog({});
     LOG_LEVEL = 7;
     FailQueueLock(1, ENOLCK);
     EXPECT_FALSE(AddTrip());
     ExpectLog(
-        {std::string("utils:507 flock fail, path=") + kQueue + ", reason=No locks available"});
+        {std::string("utils:507 flock fail, path=") + kPhotoQueue + ", reason=No locks available"});
 }
 
 TEST_F(EventQueueTest, TheLockErrorIsToldBeforeTheMark) {
@@ -501,7 +497,7 @@ TEST_F(EventQueueTest, ALockErrorAfterBusyLocksMarksTheShare) {
     LOG_LEVEL = 7;
     Fault::Quiet(Call::Usleep);
     Fault::On(Call::Flock, [attempt = 0](CallInfo &info) mutable -> std::optional<long> {
-        if (info.path != kQueue) {
+        if (info.path != kPhotoQueue) {
             return std::nullopt;
         }
         errno = ++attempt < 3 ? EAGAIN : ENOLCK;
@@ -510,10 +506,10 @@ TEST_F(EventQueueTest, ALockErrorAfterBusyLocksMarksTheShare) {
     EXPECT_FALSE(AddTrip());
     EXPECT_EQ(Fault::Calls(Call::Usleep), 2U);
     EXPECT_EQ(QueueCalls(Call::Flock), 3U);
-    EXPECT_EQ(ReadText(kQueue), "");
+    EXPECT_EQ(ReadText(kPhotoQueue), "");
     ExpectMark("photos");
     ExpectLog(
-        {std::string("utils:507 flock fail, path=") + kQueue + ", reason=No locks available"});
+        {std::string("utils:507 flock fail, path=") + kPhotoQueue + ", reason=No locks available"});
 }
 
 TEST_F(EventQueueTest, AQueueThatCannotBeOpenedAgainMarksTheShareWithoutAMessage) {
@@ -521,7 +517,7 @@ TEST_F(EventQueueTest, AQueueThatCannotBeOpenedAgainMarksTheShareWithoutAMessage
     Fault::Quiet(Call::Usleep);
     FailQueueLock(1, EAGAIN);
     Fault::On(Call::Open, [opened = 0](CallInfo &info) mutable -> std::optional<long> {
-        if (info.path != kQueue || ++opened == 1) {
+        if (info.path != kPhotoQueue || ++opened == 1) {
             return std::nullopt;
         }
         errno = EMFILE;
@@ -529,7 +525,7 @@ TEST_F(EventQueueTest, AQueueThatCannotBeOpenedAgainMarksTheShareWithoutAMessage
     });
     EXPECT_FALSE(AddTrip());
     EXPECT_EQ(QueueCalls(Call::Open), 2U);
-    EXPECT_EQ(ReadText(kQueue), "");
+    EXPECT_EQ(ReadText(kPhotoQueue), "");
     ExpectMark("photos");
     ExpectLog({});
 }
@@ -543,7 +539,7 @@ TEST_F(EventQueueTest, LockMessagesNeedExactlyLevelSeven) {
         FailQueueLock(3, EAGAIN);
         EXPECT_TRUE(AddTrip());
         Fault::On(Call::Write, [](CallInfo &info) -> std::optional<long> {
-            return info.path == kQueue ? std::optional<long>(5) : std::nullopt;
+            return info.path == kPhotoQueue ? std::optional<long>(5) : std::nullopt;
         });
         EXPECT_TRUE(AddTrip());
         ExpectLog({});
@@ -556,7 +552,7 @@ TEST_F(EventQueueTest, AShortWriteCountsAsDone) {
     const std::string length = std::to_string(std::string(kTripLine).size());
     for (const int level : {3, 7}) {
         LOG_LEVEL = level;
-        RemoveTree(kQueue);
+        RemoveTree(kPhotoQueue);
         Fault::Reset();
         Fault::Record(Call::Flock);
         Fault::On(Call::Write, [](CallInfo &info) -> std::optional<long> {
@@ -564,7 +560,7 @@ TEST_F(EventQueueTest, AShortWriteCountsAsDone) {
             return std::nullopt;
         });
         EXPECT_TRUE(AddTrip());
-        EXPECT_EQ(ReadText(kQueue), std::string(kTripLine).substr(0, 5));
+        EXPECT_EQ(ReadText(kPhotoQueue), std::string(kTripLine).substr(0, 5));
         EXPECT_EQ(Fault::Calls(Call::Write), 1U) << "one write, whatever it does";
         EXPECT_EQ(Fault::Log(Call::Flock).back().number, LOCK_UN);
         ExpectLog(level == 7 ? std::vector<std::string>{"utils:502 write fail, (5, " + length + ")"}
@@ -580,7 +576,7 @@ TEST_F(EventQueueTest, AFailedWriteCountsAsDone) {
     ExpectLog(
         {"utils:502 write fail, (-1, " + std::to_string(std::string(kTripLine).size()) + ")"});
     EXPECT_EQ(Fault::Calls(Call::Write), 1U);
-    EXPECT_EQ(ReadText(kQueue), "");
+    EXPECT_EQ(ReadText(kPhotoQueue), "");
     ExpectNoMark();
 }
 
@@ -590,9 +586,9 @@ TEST_F(EventQueueTest, TheShortWriteIsToldBeforeTheUnlock) {
     Fault::Fail(Call::Write, EIO);
     EXPECT_TRUE(AddTrip());
     EXPECT_THAT(Effects(), ElementsAre("VANOEAMKDir(0, /volume1/photos/@eaDir)",
-                                       std::string("flock(") + kQueue + ", 6)",
+                                       std::string("flock(") + kPhotoQueue + ", 6)",
                                        StartsWith("log: utils:502 write fail, "),
-                                       std::string("flock(") + kQueue + ", 8)"));
+                                       std::string("flock(") + kPhotoQueue + ", 8)"));
     (void)SystemLog::Get().Lines();
 }
 
@@ -606,63 +602,63 @@ TEST_F(EventQueueTest, AWholeWriteIsNoNews) {
 TEST_F(EventQueueTest, AnEventBeyondAMebibyteMarksTheShare) {
     const std::size_t frame = std::string(kTripLine).size() - 1; // with "{}" as long as two quotes
     const std::string most((std::size_t{1} << 20) - frame, 'x');
-    EXPECT_TRUE(AddCustomEvent(kSettingChanged, kTrip, most));
-    EXPECT_EQ(ReadText(kQueue).size(), (std::size_t{1} << 20) + 1);
-    EXPECT_EQ(ReadJson(kQueue)["data"], most);
+    EXPECT_TRUE(AddCustomEvent(kSettingEvent, kTrip, most));
+    EXPECT_EQ(ReadText(kPhotoQueue).size(), (std::size_t{1} << 20) + 1);
+    EXPECT_EQ(ReadJson(kPhotoQueue)["data"], most);
     ExpectNoMark();
-    EXPECT_FALSE(AddCustomEvent(kSettingChanged, kTrip, most + "x"));
-    EXPECT_EQ(ReadText(kQueue).size(), (std::size_t{1} << 20) + 1);
+    EXPECT_FALSE(AddCustomEvent(kSettingEvent, kTrip, most + "x"));
+    EXPECT_EQ(ReadText(kPhotoQueue).size(), (std::size_t{1} << 20) + 1);
     ExpectMark("photos");
     ExpectLog({});
 }
 
 TEST_F(EventQueueTest, ALongEventThatIsCoveredIsNoMark) {
-    PutFile(kQueue, PendingRows()[0].line + "\n");
-    EXPECT_TRUE(AddCustomEvent(kSettingChanged, kTrip, std::string(std::size_t{2} << 20, 'x')));
+    PutFile(kPhotoQueue, PendingRows()[0].line + "\n");
+    EXPECT_TRUE(AddCustomEvent(kSettingEvent, kTrip, std::string(std::size_t{2} << 20, 'x')));
     ExpectNoMark();
 }
 
 TEST_F(EventQueueTest, ALineBeyondAMebibyteCoversNothing) {
     const std::string line = PendingRows()[0].line;
-    PutFile(kQueue, line + std::string((std::size_t{1} << 20) - line.size(), ' ') + "\n");
+    PutFile(kPhotoQueue, line + std::string((std::size_t{1} << 20) - line.size(), ' ') + "\n");
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kQueue).size(), (std::size_t{1} << 20) + 1);
-    PutFile(kQueue, line + std::string((std::size_t{1} << 20) - line.size() + 1, ' ') + "\n");
+    EXPECT_EQ(ReadText(kPhotoQueue).size(), (std::size_t{1} << 20) + 1);
+    PutFile(kPhotoQueue, line + std::string((std::size_t{1} << 20) - line.size() + 1, ' ') + "\n");
     EXPECT_TRUE(AddTrip());
-    EXPECT_GT(ReadText(kQueue).size(), (std::size_t{1} << 20) + 2);
+    EXPECT_GT(ReadText(kPhotoQueue).size(), (std::size_t{1} << 20) + 2);
 }
 
 // --- what stands in the queue's place -------------------------------------------------------
 
 TEST_F(EventQueueTest, ASymbolicLinkIsNotWrittenThrough) {
     PutFile("/volume2/target", "precious\n");
-    for (const char *target : {"/volume2/target", "/volume2/missing", "/volume2", kTaken}) {
+    for (const char *target : {"/volume2/target", "/volume2/missing", "/volume2", kPhotoTaken}) {
         RemoveTree(kStatusFile);
-        RemoveTree(kQueue);
-        ASSERT_EQ(::symlink(target, kQueue), 0);
+        RemoveTree(kPhotoQueue);
+        ASSERT_EQ(::symlink(target, kPhotoQueue), 0);
         EXPECT_FALSE(AddTrip()) << target;
         ExpectMark("photos");
         ExpectLog({});
     }
     EXPECT_EQ(ReadText("/volume2/target"), "precious\n");
     EXPECT_FALSE(Exists("/volume2/missing"));
-    EXPECT_FALSE(Exists(kTaken));
+    EXPECT_FALSE(Exists(kPhotoTaken));
 }
 
 TEST_F(EventQueueTest, ALinkToAPendingReindexCoversNothing) {
     PutFile("/volume2/target", PendingRows()[0].line + "\n");
-    ASSERT_EQ(::symlink("/volume2/target", kTaken), 0);
+    ASSERT_EQ(::symlink("/volume2/target", kPhotoTaken), 0);
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kQueue), kTripLine);
+    EXPECT_EQ(ReadText(kPhotoQueue), kTripLine);
 }
 
 TEST_F(EventQueueTest, OnlyARegularFileIsWrittenTo) {
-    ASSERT_EQ(::mkfifo(kQueue, 0600), 0);
+    ASSERT_EQ(::mkfifo(kPhotoQueue, 0600), 0);
     EXPECT_FALSE(AddTrip()) << "a FIFO without a reader";
     ExpectMark("photos");
     {
         RemoveTree(kStatusFile);
-        const int reader = ::open(kQueue, O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+        const int reader = ::open(kPhotoQueue, O_RDONLY | O_NONBLOCK | O_CLOEXEC);
         EXPECT_FALSE(AddTrip()) << "a FIFO with a reader";
         char byte = 0;
         EXPECT_EQ(::read(reader, &byte, 1), 0);
@@ -670,13 +666,13 @@ TEST_F(EventQueueTest, OnlyARegularFileIsWrittenTo) {
         ExpectMark("photos");
     }
     RemoveTree(kStatusFile);
-    RemoveTree(kQueue);
-    MakeDirs(kQueue);
+    RemoveTree(kPhotoQueue);
+    MakeDirs(kPhotoQueue);
     EXPECT_FALSE(AddTrip()) << "a directory";
     ExpectMark("photos");
     RemoveTree(kStatusFile);
-    RemoveTree(kQueue);
-    const int socket = ListenAt(kQueue);
+    RemoveTree(kPhotoQueue);
+    const int socket = ListenAt(kPhotoQueue);
     EXPECT_FALSE(AddTrip()) << "a socket";
     ::close(socket);
     ExpectMark("photos");
@@ -684,7 +680,7 @@ TEST_F(EventQueueTest, OnlyARegularFileIsWrittenTo) {
 }
 
 TEST_F(EventQueueTest, ADeviceIsNotWrittenTo) {
-    if (::mknod(kQueue, S_IFCHR | 0600, makedev(1, 3)) != 0) {
+    if (::mknod(kPhotoQueue, S_IFCHR | 0600, makedev(1, 3)) != 0) {
         GTEST_SKIP() << "device files cannot be made here";
     }
     Fault::Count(Call::Write);
@@ -695,51 +691,48 @@ TEST_F(EventQueueTest, ADeviceIsNotWrittenTo) {
 }
 
 TEST_F(EventQueueTest, AQueueThatWasTakenOverBeforeTheLockIsLeftAlone) {
-    PutFile(kQueue, "before\n");
-    Fault::On(Call::Flock, [first = true](CallInfo &info) mutable -> std::optional<long> {
+    PutFile(kPhotoQueue, "before\n");
+    Fault::Before(Call::Flock, [first = true](CallInfo &info) mutable {
         if (first) {
             first = false;
-            EXPECT_EQ(info.path, kQueue);
-            EXPECT_EQ(::rename(kQueue, kTaken), 0);
+            EXPECT_EQ(info.path, kPhotoQueue);
+            EXPECT_EQ(::rename(kPhotoQueue, kPhotoTaken), 0);
         }
-        return std::nullopt;
     });
     Fault::Count(Call::Usleep);
     LOG_LEVEL = 7;
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kTaken), "before\n") << "what is written there now is lost";
-    EXPECT_EQ(ReadText(kQueue), kTripLine);
+    EXPECT_EQ(ReadText(kPhotoTaken), "before\n") << "what is written there now is lost";
+    EXPECT_EQ(ReadText(kPhotoQueue), kTripLine);
     EXPECT_EQ(Fault::Calls(Call::Usleep), 0U) << "nobody holds the lock";
     ExpectLog({});
     ExpectNoMark();
 }
 
 TEST_F(EventQueueTest, AQueueThatWasReplacedBeforeTheLockIsOpenedAfresh) {
-    PutFile(kQueue, "before\n");
-    Fault::On(Call::Flock, [first = true](CallInfo &) mutable -> std::optional<long> {
+    PutFile(kPhotoQueue, "before\n");
+    Fault::Before(Call::Flock, [first = true](CallInfo &) mutable {
         if (first) {
             first = false;
-            EXPECT_EQ(::rename(kQueue, kTaken), 0);
-            PutFile(kQueue, "new\n");
+            EXPECT_EQ(::rename(kPhotoQueue, kPhotoTaken), 0);
+            PutFile(kPhotoQueue, "new\n");
         }
-        return std::nullopt;
     });
     EXPECT_TRUE(AddTrip());
-    EXPECT_EQ(ReadText(kTaken), "before\n");
-    EXPECT_EQ(ReadText(kQueue), std::string("new\n") + kTripLine);
+    EXPECT_EQ(ReadText(kPhotoTaken), "before\n");
+    EXPECT_EQ(ReadText(kPhotoQueue), std::string("new\n") + kTripLine);
 }
 
 TEST_F(EventQueueTest, AQueueThatIsTakenOverThreeTimesMarksTheShare) {
     LOG_LEVEL = 7;
-    Fault::On(Call::Flock, [](CallInfo &info) -> std::optional<long> {
-        if (info.path == kQueue && (info.number & LOCK_EX) != 0) {
-            EXPECT_EQ(::rename(kQueue, kTaken), 0);
+    Fault::Before(Call::Flock, [](CallInfo &info) {
+        if (info.path == kPhotoQueue && (info.number & LOCK_EX) != 0) {
+            EXPECT_EQ(::rename(kPhotoQueue, kPhotoTaken), 0);
         }
-        return std::nullopt;
     });
     EXPECT_FALSE(AddTrip());
-    EXPECT_EQ(ReadText(kTaken), "");
-    EXPECT_FALSE(Exists(kQueue));
+    EXPECT_EQ(ReadText(kPhotoTaken), "");
+    EXPECT_FALSE(Exists(kPhotoQueue));
     ExpectMark("photos");
     ExpectLog({});
 }
@@ -752,21 +745,21 @@ TEST_F(EventQueueTest, BusyLocksAmongTakeoversMarkTheShare) {
         Fault::Quiet(Call::Usleep);
         LOG_LEVEL = 7;
         Fault::On(Call::Flock, [busy, attempt = 0](CallInfo &info) mutable -> std::optional<long> {
-            if (info.path != kQueue || (info.number & LOCK_EX) == 0) {
+            if (info.path != kPhotoQueue || (info.number & LOCK_EX) == 0) {
                 return std::nullopt;
             }
             if (attempt++ == busy) {
                 errno = EAGAIN;
                 return -1;
             }
-            EXPECT_EQ(::rename(kQueue, kTaken), 0);
+            EXPECT_EQ(::rename(kPhotoQueue, kPhotoTaken), 0);
             return std::nullopt;
         });
         EXPECT_FALSE(AddTrip());
         EXPECT_EQ(Fault::Calls(Call::Usleep), 1U);
         ExpectMark("photos");
         ExpectLog({});
-        RemoveTree(kQueue);
+        RemoveTree(kPhotoQueue);
     }
 }
 
@@ -797,7 +790,7 @@ TEST_F(EventQueueTest, ThreadsNeverMixTheirLines) {
     for (std::thread &thread : threads) {
         thread.join();
     }
-    std::ifstream queue(kQueue);
+    std::ifstream queue(kPhotoQueue);
     std::string line;
     std::set<std::string> paths;
     while (std::getline(queue, line)) {

@@ -22,10 +22,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr char kShare[] = "/volume1/photos";
 constexpr char kMetadataDir[] = "/volume1/photos/@eaDir";
-constexpr char kQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";
-constexpr char kDatabase[] = "/volume1/photos/@eaDir/VANO@.fileindexdb";
 
 // What lies outside the share, laid out as a share so that every link finds what it looks for:
 //
@@ -60,7 +57,7 @@ struct Level {
     const char *target;
 };
 
-constexpr std::array kLevels = {Level{"Queue", kQueue, kOutsideQueue},
+constexpr std::array kLevels = {Level{"Queue", kPhotoQueue, kOutsideQueue},
                                 Level{"MetadataDir", kMetadataDir, kOutsideDir}};
 
 void SwapForLink(const Level &level) {
@@ -100,7 +97,7 @@ class HostileShareTest : public LibraryTest {
     }
 
     void PrepareShare() {
-        platform.AddShare("photos", kShare);
+        platform.AddShare("photos", kPhotos);
         MakeDirs("/volume1/photos/trip");
         MakeDirs(kMetadataDir);
     }
@@ -176,8 +173,8 @@ TEST_F(HostileShareTest, ADatabaseBehindALinkIsAFailureThatIsLogged) {
     SwapForLink(kLevels[1]);
     platform.AnswerAlways("VANOEAMKDir", 0);
     EXPECT_TRUE(MakeDatabase());
-    ExpectLog(
-        {"utils:750 mkdir failed, path=" + std::string(kDatabase) + ", reason=Not a directory"});
+    ExpectLog({"utils:750 mkdir failed, path=" + std::string(kPhotoDatabase) +
+               ", reason=Not a directory"});
     ExpectOutsideUntouched();
 }
 
@@ -188,8 +185,9 @@ TEST_F(HostileShareTest, NothingIsRemovedThroughALink) {
     EventTrace::Get().Clear();
     EXPECT_TRUE(IndexMgr::CleanShareIndexData("photos"));
     EXPECT_THAT(Effects(), Each(Not(HasSubstr("/bin/rm"))));
-    EXPECT_THAT(TakeLog(), Contains(HasSubstr("Refused to remove, path=" + std::string(kQueue) +
-                                              ", reason=Not a directory")));
+    EXPECT_THAT(TakeLog(),
+                Contains(HasSubstr("Refused to remove, path=" + std::string(kPhotoQueue) +
+                                   ", reason=Not a directory")));
     ExpectOutsideUntouched();
 }
 
@@ -211,7 +209,7 @@ TEST_F(HostileShareTest, ALinkInPlaceOfTheQueueIsItselfRemoved) {
     SwapForLink(kLevels[0]);
     EventTrace::Get().Clear();
     EXPECT_TRUE(IndexMgr::CleanShareIndexData("photos"));
-    EXPECT_THAT(Effects(), Contains(HasSubstr(kQueue))); // rm removes links, not targets
+    EXPECT_THAT(Effects(), Contains(HasSubstr(kPhotoQueue))); // rm removes links, not targets
     ExpectOutsideUntouched();
 }
 
@@ -220,8 +218,8 @@ TEST_F(HostileShareTest, ALinkInPlaceOfTheQueueIsItselfRemoved) {
 // The way to the share is the administrator's: a directory that moved to another volume may have
 // left a link behind.
 TEST_F(HostileShareTest, TheSharesDirectoryMayBeALink) {
-    fs::rename(kShare, "/volume1/moved");
-    ASSERT_EQ(::symlink("/volume1/moved", kShare), 0);
+    fs::rename(kPhotos, "/volume1/moved");
+    ASSERT_EQ(::symlink("/volume1/moved", kPhotos), 0);
     EXPECT_TRUE(AddEvent());
     EXPECT_THAT(ReadText("/volume1/moved/@eaDir/VANO@file_index_queue"),
                 HasSubstr("/volume1/photos/trip"));
@@ -238,21 +236,21 @@ TEST_F(HostileShareTest, TheSharesDirectoryMayBeALink) {
 
 // A backup may hold the queue's second name.
 TEST_F(HostileShareTest, AQueueWithASecondNameIsAppendedTo) {
-    PutFile(kQueue, "before\n");
-    ASSERT_EQ(::link(kQueue, "/volume1/backup"), 0);
+    PutFile(kPhotoQueue, "before\n");
+    ASSERT_EQ(::link(kPhotoQueue, "/volume1/backup"), 0);
     EXPECT_TRUE(AddEvent());
-    EXPECT_THAT(ReadText(kQueue), HasSubstr("/volume1/photos/trip"));
+    EXPECT_THAT(ReadText(kPhotoQueue), HasSubstr("/volume1/photos/trip"));
     EXPECT_FALSE(IsMarked());
 }
 
 TEST_F(HostileShareTest, AQueueOfAnotherOwnerIsAppendedToAndKeepsItsOwner) {
-    PutFile(kQueue, "");
-    if (::chown(kQueue, 65534, 65534) != 0) {
+    PutFile(kPhotoQueue, "");
+    if (::chown(kPhotoQueue, 65534, 65534) != 0) {
         GTEST_SKIP() << "files cannot be given away here";
     }
     EXPECT_TRUE(AddEvent());
     struct stat info {};
-    ASSERT_EQ(::stat(kQueue, &info), 0);
+    ASSERT_EQ(::stat(kPhotoQueue, &info), 0);
     EXPECT_EQ(info.st_uid, 65534U);
     EXPECT_GT(info.st_size, 0);
 }
@@ -294,12 +292,11 @@ class SwappedShareTest : public HostileShareTest, public ::testing::WithParamInt
         int calls = 0;
         bool swapped = false;
         for (const Call call : kCalls) {
-            Fault::On(call, [&](CallInfo &) -> std::optional<long> {
+            Fault::Before(call, [&](CallInfo &) {
                 if (++calls == number) {
                     SwapForLink(swap.level);
                     swapped = true;
                 }
-                return std::nullopt;
             });
         }
         (void)swap.operation.run();
@@ -317,8 +314,8 @@ TEST_P(SwappedShareTest, NothingOutsideIsTouchedWheneverTheSwapComes) {
         RemoveTree("/volume1/photos");
         RemoveTree("/volume1/photos.away");
         PrepareShare();
-        PutFile(kQueue, R"({"event":256,"path":"/volume1/photos/other"})"
-                        "\n");
+        PutFile(kPhotoQueue, R"({"event":256,"path":"/volume1/photos/other"})"
+                             "\n");
         swapped = SwapBefore(number, GetParam());
         ExpectOutsideUntouched();
         EXPECT_THAT(TakeLog(), Each(Not(HasSubstr("precious"))));

@@ -156,10 +156,7 @@ TEST_P(IndexLocationTest, AnUnknownShareIsRefused) {
 }
 
 TEST_P(IndexLocationTest, TheShareRecordIsHeldToTheEnd) {
-    Fault::On(Call::Mkdir, [&](CallInfo &) -> std::optional<long> {
-        EXPECT_EQ(platform.LiveRecords(), 1U);
-        return std::nullopt;
-    });
+    Fault::Before(Call::Mkdir, [&](CallInfo &) { EXPECT_EQ(platform.LiveRecords(), 1U); });
     (void)Get("photos", buffer, sizeof(buffer));
     EXPECT_THAT(platform.Trace(),
                 ElementsAre("VANOShareGet(photos)", "VANOEAMKDir(0, /volume1/photos/@eaDir)",

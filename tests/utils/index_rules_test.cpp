@@ -13,7 +13,6 @@ namespace VANO::TESTS {
 
 namespace {
 
-constexpr char kPhotos[] = "/volume1/photos";
 constexpr int kRefusedType = 12;
 
 class IndexRulesTest : public LibraryTest {

@@ -1,4 +1,4 @@
-#include "machine.h"
+#include "testbed.h"
 
 #include <csignal>
 #include <stdexcept>
@@ -10,15 +10,11 @@
 
 namespace VANO::TORTURE {
 
-const std::vector<Share> kShares = {
-    {"media", "/volume2/media"}, {"photos", "/volume1/photos"}, {"pictures", "/volume1/pictures"}};
+const std::vector<std::string> kShares = {"/volume2/media", kPhotos, "/volume1/pictures"};
 
 namespace {
 
-using namespace TESTS;
-
 constexpr char kSwitch[] = "/run/torture.spotlight";
-constexpr char kDaemonSocket[] = "/run/fileindexd.sock";
 constexpr char kLogSocket[] = "/dev/log";
 constexpr char kNowhere[] = "/dev/null";
 
@@ -26,11 +22,6 @@ void CoverProgram(const char *program, const std::string &standIn) {
     if (::mount(standIn.c_str(), program, nullptr, MS_BIND, nullptr) != 0) {
         throw std::runtime_error(std::string("cannot cover ") + program);
     }
-}
-
-void PutScript(const std::string &path) {
-    PutFile(path, "#!/bin/sh\n");
-    (void)::chmod(path.c_str(), 0755);
 }
 
 void PutOrRemove(const std::string &path, const std::optional<std::string> &text) {
@@ -56,20 +47,16 @@ void LookInto(Snapshot &snapshot, const std::string &directory) {
 
 } // namespace
 
-std::string QueueOf(const Share &share) {
-    return std::string(share.directory) + "/@eaDir/" + kQueueName;
-}
-
-std::vector<std::string> EventsAtStart(const Share &share) {
+std::vector<std::string> EventsAtStart(const std::string &share) {
     std::vector<std::string> events;
     for (const char *number : {"1", "2"}) {
-        events.push_back(R"({"data":null,"event":2,"path":")" + std::string(share.directory) +
-                         "/earlier" + number + "\"}");
+        const std::string line = EventLine(share + "/earlier" + number, 2);
+        events.push_back(line.substr(0, line.size() - 1));
     }
     return events;
 }
 
-Machine::Machine(const std::string &standIn, bool hasDaemon) {
+Testbed::Testbed(const std::string &standIn, bool hasDaemon) {
     for (const char *program :
          {"/usr/bin/testparm", "/usr/bin/net", "/usr/sbin/service", "/usr/sbin/update-rc.d"}) {
         if (Exists(program)) {
@@ -78,68 +65,59 @@ Machine::Machine(const std::string &standIn, bool hasDaemon) {
     }
     PutFile("/usr/vano/bin/vanozemnotify", "");
     CoverProgram("/usr/vano/bin/vanozemnotify", standIn);
-    PutScript("/etc/init.d/fileindexd");
-    PutScript("/etc/init.d/smbd");
-    Json::Value table;
-    for (const Share &share : kShares) {
-        table[share.name] = share.directory;
-        for (const char *folder : {"/2016", "/2017", "/films", "/@eaDir"}) {
-            MakeDirs(share.directory + std::string(folder));
-        }
-    }
-    PutFile("/usr/vano/etc/shares.json", CompactText(table));
+    PutProgram("/etc/init.d/fileindexd", "");
+    PutProgram("/etc/init.d/smbd", "");
+    PutShares({{"media", kShares[0]}, {"photos", kShares[1]}, {"pictures", kShares[2]}},
+              {"2016", "2017", "films"});
     PutFile(kFolderLock, "");
     PutFile(kStatusLock, "");
-    Start({LOG_LISTENER_PATH}, kLogSocket);
+    Launch({LOG_LISTENER_PATH}, kLogSocket);
     if (hasDaemon) {
-        Start({PEER_PATH, "--queue", "/tmp/none"}, kDaemonSocket); // leaves the queues alone
+        Launch({PEER_PATH, "--queue", "/tmp/none"}, kDaemonSocket); // leaves the queues alone
     }
 }
 
-void Machine::Start(const std::vector<std::string> &program, const char *socket) {
+void Testbed::Launch(const std::vector<std::string> &program, const char *socket) {
     others_.push_back(std::make_unique<Child>(program, kNowhere, kNowhere));
     if (!Eventually([socket] { return Exists(socket); })) {
         throw std::runtime_error("nobody listens at " + std::string(socket));
     }
 }
 
-Machine::~Machine() {
+Testbed::~Testbed() {
     for (const auto &other : others_) {
         other->Signal(SIGTERM);
         (void)other->Wait();
     }
 }
 
-void Machine::Reset(const Start &start) {
+void Testbed::Reset(const Start &start) {
     for (const std::string directory : {kSettingsDirectory, kMonitorDirectory}) {
         for (const std::string &name : Names(directory)) {
             RemoveTree(directory + "/" + name);
         }
     }
-    PutOrRemove(kFolderConf, start.folders);
-    PutOrRemove(kStatusConf, start.status);
+    PutOrRemove(kFolderFile, start.folders);
+    PutOrRemove(kStatusFile, start.status);
     PutFile(kSwitch, start.spotlight ? "yes" : "no");
-    for (const Share &share : kShares) {
-        const std::string metadata = share.directory + std::string("/@eaDir");
-        for (const std::string &name : Names(metadata)) {
-            RemoveTree(metadata + "/" + name);
-        }
+    for (const std::string &share : kShares) {
+        RemoveTree(share + "/@eaDir");
         std::string text;
         for (const std::string &event : EventsAtStart(share)) {
             text += event + "\n";
         }
         PutFile(QueueOf(share), text);
-        MakeDirs(metadata + "/VANO@.fileindexdb");
+        MakeDirs(DatabaseOf(share));
     }
 }
 
-Snapshot Machine::Look() {
+Snapshot Testbed::Look() {
     Snapshot snapshot;
     for (const char *directory : {kSettingsDirectory, kMonitorDirectory, "/tmp"}) {
         LookInto(snapshot, directory);
     }
-    for (const Share &share : kShares) {
-        LookInto(snapshot, share.directory + std::string("/@eaDir"));
+    for (const std::string &share : kShares) {
+        LookInto(snapshot, share + "/@eaDir");
     }
     return snapshot;
 }
