@@ -157,7 +157,7 @@ TEST_F(CtlTest, QueryWhyNamesTheSettingOfAShareThatIsGone) {
     EXPECT_EQ(Ctl({"query", "--why", "/gone/x/y"}).out,
               "indexed  /gone/x/y\n"
               "  by /gone/x, for no file types\n"
-              "  but left out: there is no share of that name\n");
+              "  but left out: no share has that name\n");
 }
 
 TEST_F(CtlTest, QueryWhyNamesTheDeepestFolder) {

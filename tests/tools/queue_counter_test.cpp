@@ -70,23 +70,23 @@ TEST_F(QueueCounterTest, CountsTheQueueAndTheOneTakenOver) {
     PutFile(kTaken, Event("/v/a/1"));
     PutFile(kQueue, Event("/v/a/2") + Event("/v/c"));
     EXPECT_EQ(Count(), 3U);
-    EXPECT_EQ(counter.EventsOf(0), 2U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 2U);
 }
 
 TEST_F(QueueCounterTest, AnEventCountsForEveryFolderThatItLiesIn) {
     PutFile(kQueue, Event("/v/a") + Event("/v/a/deep/er/file") + Event("/v/ab") + Event("/v/b/") +
                         Event("/v") + Event("/v/a/deeper"));
     EXPECT_EQ(Count(), 6U);
-    EXPECT_EQ(counter.EventsOf(0), 3U);
-    EXPECT_EQ(counter.EventsOf(1), 1U);
-    EXPECT_EQ(counter.EventsOf(2), 1U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 3U);
+    EXPECT_EQ(counter.EventsOf("/v/a/deep"), 1U);
+    EXPECT_EQ(counter.EventsOf("/v/b"), 1U);
 }
 
 TEST_F(QueueCounterTest, AMoveCountsOnceOnEitherSide) {
     PutFile(kQueue, Move("/v/a/x", "/v/b/x") + Move("/v/a/x", "/v/a/y"));
     EXPECT_EQ(Count(), 2U);
-    EXPECT_EQ(counter.EventsOf(0), 2U);
-    EXPECT_EQ(counter.EventsOf(2), 1U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 2U);
+    EXPECT_EQ(counter.EventsOf("/v/b"), 1U);
 }
 
 TEST_F(QueueCounterTest, AFormerPathMattersInMovesOnly) {
@@ -95,7 +95,7 @@ TEST_F(QueueCounterTest, AFormerPathMattersInMovesOnly) {
                     R"({"event":256,"path":"/v/c","path_old":{}})"
                     "\n");
     EXPECT_EQ(Count(), 2U);
-    EXPECT_EQ(counter.EventsOf(0), 0U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 0U);
 }
 
 TEST_F(QueueCounterTest, LinesThatAreNoEventsDoNotCount) {
@@ -110,7 +110,7 @@ TEST_F(QueueCounterTest, NamesAreBytes) {
     QueueCounter bytes(kQueue, {"/v/\xff"});
     PutFile(kQueue, Event("/v/\xff/x"));
     EXPECT_TRUE(bytes.Look(kForever));
-    EXPECT_EQ(bytes.EventsOf(0), 1U);
+    EXPECT_EQ(bytes.EventsOf("/v/\xff"), 1U);
 }
 
 // Only a second reading could see that.
@@ -157,14 +157,14 @@ TEST_F(QueueCounterTest, ALineMayComeInPieces) {
     EXPECT_EQ(Count(), 0U);
     Append(kQueue, event.substr(20) + event);
     EXPECT_EQ(Count(), 2U);
-    EXPECT_EQ(counter.EventsOf(0), 2U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 2U);
 }
 
 TEST_F(QueueCounterTest, LinesMayCrossTheBoundsOfWhatIsReadAtOnce) {
     const std::string event = Event("/v/a/" + std::string(70, 'x'));
     PutFile(kQueue, Times(5000, event));
     EXPECT_EQ(Count(), 5000U);
-    EXPECT_EQ(counter.EventsOf(0), 5000U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 5000U);
 }
 
 TEST_F(QueueCounterTest, AQueueTakenOverIsNotCountedAgain) {
@@ -188,8 +188,8 @@ TEST_F(QueueCounterTest, ATakenQueueReplacesTheOneBeforeIt) {
     EXPECT_EQ(Count(), 9U);
     Rename(kQueue, kTaken);
     EXPECT_EQ(Count(), 2U);
-    EXPECT_EQ(counter.EventsOf(0), 0U);
-    EXPECT_EQ(counter.EventsOf(2), 2U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 0U);
+    EXPECT_EQ(counter.EventsOf("/v/b"), 2U);
 }
 
 TEST_F(QueueCounterTest, OneFileUnderBothNamesCountsOnce) {
@@ -204,7 +204,7 @@ TEST_F(QueueCounterTest, AShorterFileIsCountedAnew) {
     EXPECT_EQ(Count(), 10U);
     PutFile(kQueue, Event("/v/b")); // in place
     EXPECT_EQ(Count(), 1U);
-    EXPECT_EQ(counter.EventsOf(0), 0U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 0U);
 }
 
 TEST_F(QueueCounterTest, AFileThatWasFilledAgainIsCountedAnew) {
@@ -212,7 +212,7 @@ TEST_F(QueueCounterTest, AFileThatWasFilledAgainIsCountedAnew) {
     EXPECT_EQ(Count(), 10U);
     PutFile(kQueue, Times(20, Event("/v/b"))); // the same file, and longer
     EXPECT_EQ(Count(), 20U);
-    EXPECT_EQ(counter.EventsOf(0), 0U);
+    EXPECT_EQ(counter.EventsOf("/v/a"), 0U);
 }
 
 TEST_F(QueueCounterTest, AnotherFileInItsPlaceIsCountedAnew) {
@@ -295,11 +295,10 @@ TEST_F(QueueCounterTest, NoFoldersAndEmptyPathsAreNoTrouble) {
     PutFile(kQueue, Event("") + Event("/v/a") + Event("x"));
     EXPECT_TRUE(none.Look(kForever));
     EXPECT_EQ(none.Events(), 3U);
-    EXPECT_EQ(none.EventsOf(0), 0U);
+    EXPECT_EQ(none.EventsOf("/v/a"), 0U);
     EXPECT_TRUE(empty.Look(kForever));
-    EXPECT_EQ(empty.EventsOf(0), 0U);
-    EXPECT_EQ(empty.EventsOf(1), 1U);
-    EXPECT_EQ(empty.EventsOf(2), 0U);
+    EXPECT_EQ(empty.EventsOf(""), 0U);
+    EXPECT_EQ(empty.EventsOf("/v/a"), 1U);
 }
 
 } // namespace

@@ -5,6 +5,8 @@
 
 #include "commands/change.h"
 #include "commands/command.h"
+#include "config/settings_lock.h"
+#include "core/progress_words.h"
 #include "terminal/messages.h"
 #include "terminal/times.h"
 
@@ -12,6 +14,7 @@ namespace CTL {
 
 namespace {
 
+using VANO::FILEINDEX::kPausedWithoutEnd;
 using VANO::FILEINDEX::Status;
 
 constexpr char kFooter[] =
@@ -38,11 +41,10 @@ struct Options {
 // What StatusMgr::Pause() does, which takes whole hours only.
 bool PauseUntil(long long resumeTime) {
     Status status;
-    const auto unlock = [](Status *locked) { locked->Unlock(); };
-    const std::unique_ptr<Status, decltype(unlock)> lock(&status, unlock);
+    const VANO::FILEINDEX::SettingsLock lock(status);
     Json::Value parameters(Json::objectValue);
     parameters["resume_time"] = Json::Int64{resumeTime};
-    return status.Lock(true) && status.Load() && status.Pause(resumeTime) && status.Save() &&
+    return lock.IsHeld() && status.Load() && status.Pause(resumeTime) && status.Save() &&
            VANO::FILEINDEX::SendCammandToDaemon("pause", parameters);
 }
 

@@ -8,7 +8,7 @@
 #include "commands/command.h"
 #include "state/asked_path.h"
 #include "state/folder_view.h"
-#include "state/share_record.h"
+#include "state/known_shares.h"
 #include "terminal/messages.h"
 #include "terminal/text.h"
 
@@ -63,7 +63,7 @@ std::vector<std::string> SharesToClean(const std::vector<std::string> &paths,
     const std::set<std::string> kept = SharesOf(left);
     std::vector<std::string> shares;
     for (const std::string &share : SharesOf(paths)) {
-        if (kept.count(share) == 0 && FindShare(share)) {
+        if (kept.count(share) == 0 && !DirectoryOfShare(share).empty()) {
             shares.push_back(share);
         }
     }
@@ -88,7 +88,7 @@ ExitCode Remove(const std::vector<std::string> &paths) {
     std::vector<std::string> present;
     std::vector<std::string> gone;
     for (const std::string &path : paths) {
-        (FindShare(ShareOf(path)) ? present : gone).push_back(path);
+        (DirectoryOfShare(ShareOf(path)).empty() ? gone : present).push_back(path);
     }
     const bool isDone = While("Telling the indexing service", [&] {
         return RemoveGone(gone) && (present.empty() || IndexMgr::Delete(ArrayOf(present)));

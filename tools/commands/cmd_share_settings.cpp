@@ -9,7 +9,6 @@
 #include "state/asked_path.h"
 #include "state/folder_view.h"
 #include "state/known_shares.h"
-#include "state/share_record.h"
 #include "terminal/messages.h"
 #include "terminal/text.h"
 

@@ -5,7 +5,7 @@
 
 #include "commands/change.h"
 #include "commands/share_commands.h"
-#include "state/share_record.h"
+#include "state/known_shares.h"
 #include "terminal/messages.h"
 #include "terminal/text.h"
 

@@ -1,12 +1,11 @@
 #include <algorithm>
 #include <fileindex/index_mgr.h>
-#include <fileindex/index_rules.h>
 #include <memory>
 
 #include "commands/command.h"
 #include "state/asked_path.h"
 #include "state/folder_view.h"
-#include "state/index_refusal.h"
+#include "state/refusal_text.h"
 #include "terminal/messages.h"
 #include "terminal/output.h"
 #include "terminal/text.h"
@@ -40,8 +39,7 @@ void PrintLines(const Json::Value &folder) {
 
 ExitCode SayNotSet(const std::string &path, const std::vector<fileindex::Folder> &folders) {
     Say(Shown(path) + " is not an indexed folder.");
-    const std::string governing =
-        fileindex::GetMostSuitableCfg(Resolved(folders), ToFullPath(path))["path"].asString();
+    const std::string governing = GoverningSetting(ToFullPath(path), folders)["path"].asString();
     Advise(governing.empty() ? "fileindexctl list shows the indexed folders."
                              : "It lies in " + Shown(governing) + ", which is indexed.");
     return kNotFound;

@@ -7,7 +7,7 @@
 
 #include "state/asked_path.h"
 #include "state/folder_view.h"
-#include "state/index_refusal.h"
+#include "state/refusal_text.h"
 #include "terminal/messages.h"
 #include "terminal/text.h"
 

@@ -11,7 +11,7 @@
 #include <string_view>
 
 #include "state/folder_view.h"
-#include "state/index_refusal.h"
+#include "state/refusal_text.h"
 #include "terminal/messages.h"
 #include "terminal/text.h"
 
@@ -88,9 +88,9 @@ std::optional<Refusal> RefusalOfPath(const PathForms &path) {
 }
 
 // The library finds it by the full path, which folders of a share that is gone do not have.
-Json::Value GoverningSetting(const PathForms &path, const std::vector<Folder> &folders) {
+Json::Value SettingOf(const PathForms &path, const std::vector<Folder> &folders) {
     if (!path.fullPath.empty()) {
-        return VANO::FILEINDEX::GetMostSuitableCfg(Resolved(folders), path.fullPath);
+        return GoverningSetting(path.fullPath, folders);
     }
     const auto found = std::find_if(folders.rbegin(), folders.rend(), [&](const Folder &folder) {
         return VANO::FILEINDEX::IndexMgr::IsPathIndexed(path.sharePath, {folder});
@@ -113,7 +113,7 @@ std::string GoverningText(const Json::Value &setting, bool isIndexed) {
 } // namespace
 
 Reason ReasonOf(const PathForms &path, bool isIndexed, const std::vector<Folder> &folders) {
-    const Json::Value setting = GoverningSetting(path, folders);
+    const Json::Value setting = SettingOf(path, folders);
     std::optional<Refusal> refusal = RefusalOfPath(path);
     if (isIndexed && !refusal) {
         refusal = RefusalOfType(path.fullPath, setting);

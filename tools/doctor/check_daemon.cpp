@@ -3,37 +3,63 @@
 #include <array>
 #include <cerrno>
 #include <chrono>
+#include <fstream>
+#include <platform/diagnosis.h>
 #include <poll.h>
 #include <sys/socket.h>
 
+#include "core/paths.h"
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
-#include "doctor/process.h"
 #include "state/daemon_state.h"
+#include "terminal/text.h"
 
 namespace CTL::DOCTOR {
 
 namespace {
 
+using VANO::FILEINDEX::kDaemonSocketPath;
 using VANO::FILEINDEX::UniqueFd;
 
 constexpr int kPatienceMilliseconds = 2000; // the library's own commands wait for a second
 
 std::string StartCommand() {
-    return DirectoryError("/run/systemd/system") == 0 ? "systemctl restart fileindexd"
-                                                      : "service fileindexd restart";
+    return VANO::PLATFORM::ServiceCommand == nullptr
+               ? ""
+               : VANO::PLATFORM::ServiceCommand("restart", VANO::FILEINDEX::kIndexingService);
+}
+
+std::string FirstLine(pid_t pid, const char *file) {
+    std::ifstream stream("/proc/" + std::to_string(pid) + "/" + file);
+    std::string line;
+    std::getline(stream, line);
+    return line;
+}
+
+// "smbd (PID 123)"; "an unknown process" for one that has ended or that this user may not see.
+std::string ProcessName(pid_t pid) {
+    const std::string name = pid > 0 ? FirstLine(pid, "comm") : "";
+    return name.empty() ? "an unknown process" : Shown(name) + " (PID " + std::to_string(pid) + ")";
+}
+
+// The letter of its state; 0 when it cannot be told.
+char ProcessState(pid_t pid) {
+    // "123 (any name, also with brackets) S ..."
+    const std::string line = pid > 0 ? FirstLine(pid, "stat") : "";
+    const std::size_t end = line.rfind(')');
+    return end == std::string::npos || end + 2 >= line.size() ? '\0' : line[end + 2];
 }
 
 Finding NotRunning(const Evidence &evidence, const std::string &what) {
     Finding finding =
-        Ok("daemon-stopped", kDaemonSocket, what + ", as it should: no folder is set");
+        Ok("daemon-stopped", kDaemonSocketPath, what + ", which is right: no folder is set");
     if (evidence.HasFolders()) {
-        finding = Error("daemon-stopped", kDaemonSocket, what)
+        finding = Error("daemon-stopped", kDaemonSocketPath, what)
                       .Because("Nothing is indexed. Folders that are set: " +
                                std::to_string(evidence.folders.size()) + ".")
                       .Fix("Start it.", StartCommand());
     } else if (!evidence.areFoldersKnown) {
-        finding = Warning("daemon-stopped", kDaemonSocket, what)
+        finding = Warning("daemon-stopped", kDaemonSocketPath, what)
                       .Fix("Fix the settings first, then start it.", StartCommand());
     }
     return finding;
@@ -68,9 +94,9 @@ bool Answers(const UniqueFd &connection) {
 }
 
 Finding Silent(const std::string &why) {
-    return Error("daemon-silent", kDaemonSocket, "fileindexd does not answer on its socket")
+    return Error("daemon-silent", kDaemonSocketPath, "fileindexd does not answer on its socket")
         .Because(why)
-        .Fix("Look at what keeps it, or restart it.", StartCommand());
+        .Fix("Find out what blocks it, or restart it.", StartCommand());
 }
 
 Finding Running(const Evidence &evidence, const UniqueFd &connection) {
@@ -78,13 +104,13 @@ Finding Running(const Evidence &evidence, const UniqueFd &connection) {
     const std::string name = ProcessName(pid);
     const char state = ProcessState(pid);
     if (state == 'T' || state == 't') {
-        return Silent(name + " is stopped by a signal; kill -CONT lets it go on.").With("pid", pid);
+        return Silent(name + " is stopped by a signal; kill -CONT continues it.").With("pid", pid);
     }
     if (!Answers(connection)) {
         return Silent(name + " listens, but took no connection within 2 seconds.").With("pid", pid);
     }
     const bool isIdle = evidence.areFoldersKnown && !evidence.HasFolders();
-    return Ok("daemon-running", kDaemonSocket,
+    return Ok("daemon-running", kDaemonSocketPath,
               "fileindexd listens and answers: " + name + (isIdle ? "; no folder is set" : ""))
         .With("pid", pid);
 }
@@ -100,10 +126,10 @@ Findings CheckDaemon(const Evidence &evidence) {
     case ENOENT:
         return {NotRunning(evidence, "fileindexd does not run")};
     case ECONNREFUSED: {
-        const FileLook look(kDaemonSocket);
+        const FileLook look(kDaemonSocketPath);
         if (look.Exists() && !S_ISSOCK(look.info.st_mode)) {
-            return {Error("daemon-socket", kDaemonSocket,
-                          std::string(kDaemonSocket) + " is " + KindOf(look.info.st_mode))
+            return {Error("daemon-socket", kDaemonSocketPath,
+                          std::string(kDaemonSocketPath) + " is " + KindOf(look.info.st_mode))
                         .Because("The daemon cannot listen there.")
                         .Fix("Move it away and restart the daemon.", StartCommand())};
         }
@@ -112,7 +138,7 @@ Findings CheckDaemon(const Evidence &evidence) {
     case EAGAIN:
         return {Silent("Too many connections wait for it already.")};
     default:
-        return {Unreadable("daemon-unreachable", kDaemonSocket, error)};
+        return {Unreadable("daemon-unreachable", kDaemonSocketPath, error)};
     }
 }
 

@@ -6,7 +6,7 @@
 
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
-#include "state/index_refusal.h"
+#include "state/refusal_text.h"
 #include "terminal/text.h"
 
 namespace CTL::DOCTOR {
@@ -41,12 +41,12 @@ void LookAtFolder(Findings &findings, const Folder &folder) {
     if (DirectoryError(fullPath) == ENOTDIR) {
         findings.push_back(
             Warning("folder-file", folder.path, Shown(folder.path) + " is no directory")
-                .Fix("Set the directory that holds it.", ShowCommand(folder.path)));
+                .Fix("Choose the directory that contains it.", ShowCommand(folder.path)));
     }
     if (!folder.document && !folder.audio && !folder.video && !folder.photo) {
         findings.push_back(
             Warning("folder-typeless", folder.path,
-                    "Of " + Shown(folder.path) + " no file type is indexed")
+                    "No file type is indexed of " + Shown(folder.path))
                 .Fix("Choose some (set), or remove the folder.", ShowCommand(folder.path)));
     }
 }
@@ -56,9 +56,7 @@ void LookAtFolder(Findings &findings, const Folder &folder) {
 Findings CheckFolders(const Evidence &evidence) {
     Findings findings;
     if (!evidence.areFoldersKnown) {
-        findings.push_back(
-            Unknown("folders-unknown", kFolderConf, "The settings cannot be loaded; see Settings"));
-        return findings;
+        return {FoldersUnknown()};
     }
     for (const Folder &folder : evidence.folders) {
         LookAtFolder(findings, folder);

@@ -1,68 +1,23 @@
-// The file-change monitor's configuration: it must watch exactly the folders that are set.
+// The file-change monitor: it must watch exactly the folders that are set.
 
-#include <cerrno>
 #include <fileindex/share_path.h>
 #include <map>
+#include <platform/diagnosis.h>
 #include <set>
 
+#include "core/paths.h"
+#include "core/share_files.h"
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
-#include "state/queue_file.h"
 #include "terminal/text.h"
 
 namespace CTL::DOCTOR {
 
 namespace {
 
-constexpr char kConsumer[] = "fileindex";
-constexpr char kSuffix[] = ".json";
-
-bool EndsWith(const std::string &name, const std::string &suffix) {
-    return name.size() >= suffix.size() &&
-           name.compare(name.size() - suffix.size(), suffix.size(), suffix) == 0;
-}
-
-struct Watch {
-    std::string file;
-    std::set<std::string> paths;
-};
-
-using Watches = std::map<std::string, Watch>; // by queue
-
-std::set<std::string> PathsIn(const Json::Value &config) {
-    std::set<std::string> paths;
-    for (const Json::Value &entry : config) {
-        if (entry.isObject() && entry["path"].isString()) {
-            paths.insert(entry["path"].asString());
-        }
-    }
-    return paths;
-}
-
-// The index's own descriptions; those of other consumers are none of its business.
-Watches ReadWatches(Findings &findings) {
-    Watches watches;
-    for (const std::string &name : NamesIn(kMonitorDirectory)) {
-        const std::string path = std::string(kMonitorDirectory) + "/" + name;
-        if (!EndsWith(name, kSuffix) || name.rfind(std::string(kConsumer) + "-", 0) != 0) {
-            continue;
-        }
-        const JsonFile file = ReadJsonFile(path);
-        const std::optional<Finding> mistake = MistakeOf(file, "monitor");
-        if (mistake) {
-            findings.push_back(Finding(*mistake).Fix("Have it written anew: resume its share.",
-                                                     "fileindexctl share resume --help"));
-        } else if (file.value.isObject() && file.value["queue"].isString() &&
-                   file.value["config"].isArray() && file.value["consumer"] == kConsumer) {
-            watches[file.value["queue"].asString()] = {path, PathsIn(file.value["config"])};
-        } else {
-            findings.push_back(Error("monitor-shape", path, Shown(path) + " describes no queue")
-                                   .Fix("Have it written anew: resume its share.",
-                                        "fileindexctl share resume --help"));
-        }
-    }
-    return watches;
-}
+using VANO::FILEINDEX::QueueIn;
+using VANO::PLATFORM::MonitorWatch;
+using Watches = std::map<std::string, MonitorWatch>; // by queue
 
 std::set<std::string> FullPathsOf(const KnownShare &share) {
     std::set<std::string> paths;
@@ -88,9 +43,9 @@ std::string Lacking(const std::set<std::string> &a, const std::set<std::string> 
 
 std::string DifferenceOf(const std::set<std::string> &wanted, const std::set<std::string> &found) {
     const std::string missing = Lacking(wanted, found);
-    const std::string surplus = Lacking(found, wanted);
+    const std::string extra = Lacking(found, wanted);
     return (missing.empty() ? "" : "Not watched: " + missing + ". ") +
-           (surplus.empty() ? "" : "Watched for nothing: " + surplus + ".");
+           (extra.empty() ? "" : "Watched needlessly: " + extra + ".");
 }
 
 void LookAtShare(Findings &findings, const KnownShare &share, const Watches &watches) {
@@ -100,63 +55,69 @@ void LookAtShare(Findings &findings, const KnownShare &share, const Watches &wat
         findings.push_back(
             Error("monitor-missing", share.name,
                   "The monitor does not watch the share " + Shown(share.name))
-                .Because("Changes in its folders are not seen. A share that was paused is not "
-                         "watched either.")
-                .Fix("Have its configuration written anew.", resume));
+                .Because("Changes in its folders are not noticed. A paused share is not watched "
+                         "either.")
+                .Fix("Write its configuration again.", resume));
         return;
     }
     const std::set<std::string> wanted = FullPathsOf(share);
-    if (watch->second.paths != wanted) {
+    const std::set<std::string> found(watch->second.paths.begin(), watch->second.paths.end());
+    if (found != wanted) {
         findings.push_back(
             Error("monitor-differs", share.name,
                   "The monitor watches other folders of " + Shown(share.name) + " than are set")
-                .Because(DifferenceOf(wanted, watch->second.paths))
-                .Fix("Have its configuration written anew.", resume)
+                .Because(DifferenceOf(wanted, found))
+                .Fix("Write its configuration again.", resume)
                 .With("file", watch->second.file));
     }
 }
 
-void LookForSurplus(Findings &findings, const Evidence &evidence, Watches watches) {
-    for (const KnownShare &share : evidence.shares) {
-        if (!share.folders.empty()) {
-            watches.erase(QueueIn(share.directory));
-        }
-    }
-    for (const auto &[queue, watch] : watches) {
-        findings.push_back(
-            Warning("monitor-surplus", watch.file,
-                    "The monitor watches for a share without folders: " + Shown(queue))
-                .Because("Its queue grows and nobody reads it.")
-                .Fix("Remove the file, or set the folders again if they were lost.",
-                     "rm " + Quoted(watch.file))
-                .With("queue", queue));
-    }
+Finding Surplus(const MonitorWatch &watch) {
+    return Warning("monitor-surplus", watch.file,
+                   "The monitor watches for a share without folders: " + Shown(watch.queue))
+        .Because("Its queue grows and nobody reads it.")
+        .Fix("Remove the file, or add the folders again if they were lost.",
+             "rm " + Quoted(watch.file))
+        .With("queue", watch.queue);
 }
 
 } // namespace
 
 Findings CheckMonitor(const Evidence &evidence) {
+    if (VANO::PLATFORM::ListMonitorWatches == nullptr) {
+        return {Unknown("monitor-unknown", "",
+                        "This platform does not tell what the change monitor watches")};
+    }
+    const auto known = VANO::PLATFORM::ListMonitorWatches(VANO::FILEINDEX::kMonitorConsumer);
     Findings findings;
-    const int error = DirectoryError(kMonitorDirectory);
-    if (error != 0 && error != ENOENT) {
-        findings.push_back(Unreadable("monitor-unreadable", kMonitorDirectory, error));
-        return findings;
+    for (const auto &fault : known.faults) {
+        findings.push_back(
+            MistakeOf(fault, "monitor")
+                .Fix("Write it again: resume its share.", "fileindexctl share resume --help"));
+        if (fault.file == known.directory) {
+            return findings;
+        }
     }
     if (!evidence.areFoldersKnown) {
-        findings.push_back(
-            Unknown("folders-unknown", kFolderConf, "The settings cannot be loaded; see Settings"));
+        findings.push_back(FoldersUnknown());
         return findings;
     }
-    const Watches watches = ReadWatches(findings);
+    Watches watches;
+    for (const MonitorWatch &watch : known.watches) {
+        watches[watch.queue] = watch;
+    }
     std::size_t watched = 0;
     for (const KnownShare &share : evidence.shares) {
         if (!share.folders.empty() && !share.directory.empty()) {
             ++watched;
             LookAtShare(findings, share, watches);
+            watches.erase(QueueIn(share.directory));
         }
     }
-    LookForSurplus(findings, evidence, watches);
-    FindStrayFiles(findings, kMonitorDirectory, kConsumer, kSuffix);
+    for (const auto &[queue, watch] : watches) {
+        findings.push_back(Surplus(watch));
+    }
+    FindStrayFiles(findings, known.directory, VANO::FILEINDEX::kMonitorConsumer, ".json");
     if (findings.empty()) {
         findings.push_back(Ok("monitor-good", "",
                               watched == 0 ? "Nothing is to be watched"

@@ -3,13 +3,15 @@
 #include <algorithm>
 #include <cerrno>
 #include <ctime>
-#include <fcntl.h>
 #include <string_view>
 #include <sys/stat.h>
 
+#include "core/event.h"
+#include "core/paths.h"
+#include "core/progress_words.h"
+#include "core/share_files.h"
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
-#include "state/queue_event.h"
 #include "state/queue_file.h"
 #include "terminal/text.h"
 #include "terminal/times.h"
@@ -42,8 +44,8 @@ QueueLook LookInto(const QueueFile &queue) {
     const auto wanted = std::min<long long>(queue.Size(), kMostQueueBytes);
     const std::string text = queue.ReadAt(0, static_cast<std::size_t>(wanted));
     look.error = errno;
-    QueueEventParser parser;
-    QueueEvent event;
+    VANO::FILEINDEX::EventParser parser;
+    VANO::FILEINDEX::QueueEvent event{};
     for (std::string_view rest = text; !rest.empty();) {
         const std::size_t end = rest.find('\n');
         if (end == std::string_view::npos && !look.isWhole) {
@@ -63,13 +65,13 @@ struct Patience {
 constexpr Patience kBeforeItIsTaken = {3600,
                                        "The daemon does not take the queue over (within an hour)."};
 constexpr Patience kOnceItIsTaken = {
-    24LL * 3600, "The daemon took this queue over and does not come to its end (within a day)."};
+    24LL * 3600, "The daemon took this queue over and has not finished it (within a day)."};
 
 // What the daemon can be expected to have done by now.
 bool MayWait(const Evidence &evidence) {
     const Json::Value &status = evidence.statusFile.value;
     const Json::Value pause = status.isObject() ? status.get("resume_time", -1) : -1;
-    return pause.isInt64() && IsPaused(pause.asInt64(), std::time(nullptr));
+    return pause.isInt64() && VANO::FILEINDEX::IsPaused(pause.asInt64(), std::time(nullptr));
 }
 
 std::string EventsOf(const QueueLook &look) {
@@ -92,9 +94,9 @@ void JudgeContent(Findings &findings, const QueueLook &look, const std::string &
         findings.push_back(WithCounts(
             Warning("queue-malformed", path,
                     Shown(path) +
-                        " holds lines that are no events: " + std::to_string(look.malformed))
-                .Because("They are passed over, and what they meant is lost.")
-                .Fix("Index the share's folders again.", ReindexCommand(share)),
+                        " has lines that are not events: " + std::to_string(look.malformed))
+                .Because("They are skipped, and what they said is lost.")
+                .Fix("Reindex the share's folders.", ReindexCommand(share)),
             look));
     }
 }
@@ -104,7 +106,7 @@ void JudgeSize(Findings &findings, const QueueLook &look, const std::string &pat
         findings.push_back(WithCounts(
             Warning("queue-long", path, Shown(path) + " is long: " + EventsOf(look))
                 .Because("The daemon does not keep up (beyond 16 MiB or 100000 events).")
-                .Fix("Look whether it runs and what it logs.", "fileindexctl doctor daemon"),
+                .Fix("Check whether it runs and what it logs.", "fileindexctl doctor daemon"),
             look));
     }
 }
@@ -114,9 +116,9 @@ void JudgeAge(Findings &findings, const QueueLook &look, const std::string &path
     if (look.age > patience.seconds) {
         findings.push_back(WithCounts(
             Warning("queue-old", path,
-                    Shown(path) + ": the oldest event has waited for " + Duration(look.age))
+                    Shown(path) + ": the oldest event has waited for " + DurationText(look.age))
                 .Because(patience.atAnEnd)
-                .Fix("Look whether it runs and what it logs.", "fileindexctl doctor daemon"),
+                .Fix("Check whether it runs and what it logs.", "fileindexctl doctor daemon"),
             look));
     }
 }
@@ -140,8 +142,7 @@ bool MayHoldQueues(Findings &findings, const std::string &directory) {
 // Why a queue could not be opened.
 Finding Obstacle(const std::string &path, int error) {
     struct stat info {};
-    const VANO::FILEINDEX::UniqueFd place = OpenQueue(path, O_PATH);
-    const bool isKnown = place && ::fstat(place.Get(), &info) == 0;
+    const bool isKnown = VANO::FILEINDEX::ShareFile(path).Stat(info);
     return isKnown && !S_ISREG(info.st_mode) ? WrongKind(path, info.st_mode)
                                              : Unreadable("queue-unreadable", path, error);
 }
@@ -175,11 +176,12 @@ void LookAtQueue(Findings &findings, const Evidence &evidence, const KnownShare 
 Findings CheckQueues(const Evidence &evidence) {
     Findings findings;
     for (const KnownShare &share : evidence.shares) {
-        const std::string queue = QueueIn(share.directory);
+        const std::string queue = VANO::FILEINDEX::QueueIn(share.directory);
         if (!share.directory.empty() && DirectoryError(share.directory) == 0 &&
             MayHoldQueues(findings, queue.substr(0, queue.rfind('/')))) {
             LookAtQueue(findings, evidence, share, queue, kBeforeItIsTaken);
-            LookAtQueue(findings, evidence, share, queue + kTakenSuffix, kOnceItIsTaken);
+            LookAtQueue(findings, evidence, share, queue + VANO::FILEINDEX::kTakenQueueSuffix,
+                        kOnceItIsTaken);
         }
     }
     if (findings.empty()) {

@@ -70,16 +70,16 @@ void LookAtMarks(Findings &findings, const KnownShare &share) {
                                  "The share " + Shown(share.name) + " is marked as out of space")
                                .Because(isEnough ? "Its indexing has stopped. There is room again."
                                                  : "Its indexing has stopped.")
-                               .Fix(isEnough ? "Let it go on." : "Make room, then let it go on.",
+                               .Fix(isEnough ? "Resume it." : "Make room, then resume it.",
                                     ReindexCommand(share)));
     }
     if (StatusMgr::ShareIsNeedReindex(share.name)) {
         findings.push_back(
             Warning("mark-need-reindex", share.name,
-                    "The share " + Shown(share.name) + " is marked as needing a new index")
-                .Because("An event could not be queued, so its index lacks "
-                         "something.")
-                .Fix("Index its folders again.", ReindexCommand(share)));
+                    "The share " + Shown(share.name) + " is marked as needing reindexing")
+                .Because("An event could not be queued, so its index is "
+                         "incomplete.")
+                .Fix("Reindex its folders.", ReindexCommand(share)));
     }
 }
 

@@ -3,6 +3,7 @@
 #include <cerrno>
 #include <fileindex/status.h>
 
+#include "core/paths.h"
 #include "doctor/checks.h"
 #include "doctor/file_kind.h"
 #include "state/folder_view.h"
@@ -11,6 +12,9 @@
 namespace CTL::DOCTOR {
 
 namespace {
+
+using VANO::FILEINDEX::kSettingsDirectory;
+using VANO::FILEINDEX::kStatusConfPath;
 
 constexpr char kRestore[] = "Fix it by hand, or restore it from a backup. Moved away, it "
                             "counts as empty.";
@@ -31,9 +35,9 @@ bool LookAtDirectory(Findings &findings) {
         findings.push_back(
             Error("settings-directory-missing", kSettingsDirectory,
                   std::string(kSettingsDirectory) +
-                      (error == ENOTDIR ? " is no directory" : " does not exist"))
+                      (error == ENOTDIR ? " is not a directory" : " does not exist"))
                 .Because("No setting can be saved.")
-                .Fix("Make it.", std::string("mkdir -p -m 755 ") + kSettingsDirectory));
+                .Fix("Create it.", std::string("mkdir -p -m 755 ") + kSettingsDirectory));
         return false;
     }
     struct stat info {};
@@ -53,8 +57,8 @@ void LookAtOwner(Findings &findings, const std::string &path) {
     } else if (S_ISLNK(look.info.st_mode)) {
         findings.push_back(
             Warning("settings-link", path, path + " is a symbolic link")
-                .Because("It is then rewritten in place: a full disk or a lost "
-                         "power line can leave half of it.")
+                .Because("It is then rewritten in place: a full disk or a power "
+                         "loss can leave half of it.")
                 .Fix("Put the file itself there.",
                      "cp --remove-destination \"$(readlink -f " + path + ")\" " + path));
     }
@@ -70,7 +74,7 @@ bool LookAtJson(Findings &findings, const JsonFile &file) {
         return false;
     }
     if (file.state == JsonFile::State::kGood && !file.value.isObject()) {
-        findings.push_back(Error("settings-shape", file.path, file.path + " is no JSON object")
+        findings.push_back(Error("settings-shape", file.path, file.path + " is not a JSON object")
                                .Fix(kRestore, EditCommand(file.path)));
         return false;
     }
@@ -79,10 +83,10 @@ bool LookAtJson(Findings &findings, const JsonFile &file) {
 
 std::string OddMemberOf(const Json::Value &folder) {
     if (!folder.isObject()) {
-        return "it is no object";
+        return "it is not an object";
     }
     if (folder.isMember("name") && !folder["name"].isString()) {
-        return "its \"name\" is no text";
+        return "its \"name\" is not a string";
     }
     for (const char *type : kFileTypes) {
         if (folder.isMember(type) && !folder[type].isBool()) {
@@ -104,16 +108,16 @@ void LookAtFolders(Findings &findings, const JsonFile &file) {
             ++odd;
             findings.push_back(
                 Warning("settings-member", path,
-                        "The folder " + Shown(path) + " is set oddly: " + member)
+                        "The folder " + Shown(path) + " has an odd setting: " + member)
                     .Because("What cannot be read counts as no.")
-                    .Fix("Set it anew (set, with a name and all types).", ShowCommand(path)));
+                    .Fix("Set it again (set, with a name and all types).", ShowCommand(path)));
         }
     }
     if (file.value.size() > kMaxFolders) {
         findings.push_back(
             Warning("settings-limit", file.path,
-                    Count(file.value.size(), "folder") + " are set; 1000 is the most")
-                .Because("No further one can be added.")
+                    Count(file.value.size(), "folder") + " are set; 1000 is the limit")
+                .Because("No more can be added.")
                 .Fix("Remove some.", "fileindexctl list"));
     }
     if (odd == 0) {
@@ -139,17 +143,18 @@ void LookAtStatus(Findings &findings, const JsonFile &file) {
     const std::size_t before = findings.size();
     if (!IsPauseReadable(file.value)) {
         findings.push_back(
-            Error("settings-member", "resume_time", "status.conf: \"resume_time\" is no number")
-                .Because("Nobody can tell whether indexing is paused.")
-                .Fix("Set it anew.", "fileindexctl resume"));
+            Error("settings-member", "resume_time", "status.conf: \"resume_time\" is not a number")
+                .Because("Whether indexing is paused cannot be told.")
+                .Fix("Set it again.", "fileindexctl resume"));
     }
     for (const char *marks : {"no_space", "need_reindex"}) {
         const Json::Value &member = file.value[marks];
         if (!member.isObject() && !member.isNull()) {
-            findings.push_back(Error("settings-member", marks,
-                                     std::string("status.conf: \"") + marks + "\" is no object")
-                                   .Because("No share can be marked.")
-                                   .Fix("Take that member out by hand.", EditCommand(kStatusConf)));
+            findings.push_back(
+                Error("settings-member", marks,
+                      std::string("status.conf: \"") + marks + "\" is not an object")
+                    .Because("No share can be marked.")
+                    .Fix("Remove that member by hand.", EditCommand(kStatusConfPath)));
         }
     }
     if (findings.size() == before) {

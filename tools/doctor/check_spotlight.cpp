@@ -15,8 +15,8 @@ Findings CheckSpotlight(const Evidence &evidence) {
     }
     if (!isKnown) {
         return {Warning("spotlight-unknown", "", "Samba cannot be asked for Spotlight")
-                    .Because("It is not installed, or refuses its own configuration.")
-                    .Fix("Install it, or fix what it complains of.", "testparm -s")};
+                    .Because("It is not installed, or rejects its configuration.")
+                    .Fix("Install it, or fix what it complains about.", "testparm -s")};
     }
     if (!isOn) {
         return {Warning("spotlight-off", "", "Spotlight is off although folders are set")

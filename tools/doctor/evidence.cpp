@@ -2,9 +2,14 @@
 
 #include <fileindex/index_mgr.h>
 
+#include "core/paths.h"
+
 namespace CTL::DOCTOR {
 
 namespace {
+
+using VANO::FILEINDEX::kFolderConfPath;
+using VANO::FILEINDEX::kStatusConfPath;
 
 constexpr std::size_t kMostNamed = 10; // on one command line
 
@@ -21,13 +26,25 @@ std::string ReindexCommand(const KnownShare &share) {
     return command;
 }
 
+Finding FoldersUnknown() {
+    return Unknown("folders-unknown", kFolderConfPath,
+                   "The settings cannot be loaded; see Settings");
+}
+
 Evidence GatherEvidence() {
     Evidence evidence;
-    evidence.folderFile = ReadJsonFile(kFolderConf);
-    evidence.statusFile = ReadJsonFile(kStatusConf);
-    evidence.shareTable = ReadJsonFile(kShareTable);
+    evidence.folderFile = ReadJsonFile(kFolderConfPath);
+    evidence.statusFile = ReadJsonFile(kStatusConfPath);
     evidence.areFoldersKnown = VANO::FILEINDEX::IndexMgr::List(evidence.folders);
-    evidence.shares = SharesOf(NamesIn(evidence.shareTable.value), evidence.folders);
+    std::set<std::string> names;
+    if (VANO::PLATFORM::ListShares != nullptr) {
+        const VANO::PLATFORM::ShareList list = VANO::PLATFORM::ListShares();
+        evidence.areSharesListed = true;
+        evidence.shareTable = list.file;
+        evidence.shareFaults = list.faults;
+        names.insert(list.names.begin(), list.names.end());
+    }
+    evidence.shares = SharesOf(names, evidence.folders);
     return evidence;
 }
 

@@ -2,6 +2,7 @@
 #define FILEINDEXCTL_DOCTOR_EVIDENCE_H
 
 #include <fileindex/folder.h>
+#include <platform/diagnosis.h>
 #include <string>
 #include <vector>
 
@@ -10,20 +11,15 @@
 
 namespace CTL::DOCTOR {
 
-constexpr char kSettingsDirectory[] = "/usr/vano/etc/fileindex";
-constexpr char kFolderConf[] = "/usr/vano/etc/fileindex/folder.conf";
-constexpr char kStatusConf[] = "/usr/vano/etc/fileindex/status.conf";
-constexpr char kFolderLock[] = "/tmp/fileidx_cfg_folder.lock";
-constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
-constexpr char kMonitorDirectory[] = "/usr/vano/etc/vanotifyd";
-
 // What the checks look at, read once.
 struct Evidence {
     JsonFile folderFile;
     JsonFile statusFile;
-    JsonFile shareTable;
     bool areFoldersKnown = false; // false when folder.conf cannot be loaded
     std::vector<VANO::FILEINDEX::Folder> folders;
+    bool areSharesListed = false; // false where the platform lists none
+    std::string shareTable;       // the file of that list
+    std::vector<VANO::PLATFORM::StoreFault> shareFaults;
     std::vector<KnownShare> shares; // in byte order of their names
 
     [[nodiscard]] bool HasFolders() const { return !folders.empty(); }
@@ -33,6 +29,9 @@ struct Evidence {
 
 // The command line that has the folders of a share indexed anew.
 [[nodiscard]] std::string ReindexCommand(const KnownShare &share);
+
+// Of what cannot be told without the folders.
+[[nodiscard]] Finding FoldersUnknown();
 
 } // namespace CTL::DOCTOR
 

@@ -7,6 +7,7 @@
 #include <set>
 
 #include "terminal/text.h"
+#include "terminal/times.h"
 
 namespace CTL::DOCTOR {
 
@@ -64,16 +65,17 @@ int DirectoryError(const std::string &path) {
 void FindOddOwner(Findings &findings, const std::string &path, const struct stat &info,
                   const char *goodMode) {
     if (info.st_uid != 0) {
-        findings.push_back(Warning("odd-owner", path,
-                                   Shown(path) + " belongs to user " + std::to_string(info.st_uid))
-                               .Because("It is root's; whoever owns it can change the service.")
-                               .Fix("Give it back.", "chown root: " + Quoted(path)));
+        findings.push_back(
+            Warning("odd-owner", path,
+                    Shown(path) + " belongs to user " + std::to_string(info.st_uid))
+                .Because("It should belong to root; its owner can change the service.")
+                .Fix("Give it to root.", "chown root: " + Quoted(path)));
     }
     if ((info.st_mode & (S_IWGRP | S_IWOTH)) != 0) {
         findings.push_back(
             Warning("odd-mode", path,
                     Shown(path) + " can be changed by others: mode " + Octal(info.st_mode))
-                .Fix("Let root alone write to it.",
+                .Fix("Let only root write to it.",
                      std::string("chmod ") + goodMode + " " + Quoted(path)));
     } else if ((info.st_mode & S_IROTH) == 0) {
         findings.push_back(
@@ -81,7 +83,7 @@ void FindOddOwner(Findings &findings, const std::string &path, const struct stat
                     Shown(path) + " cannot be read by others: mode " + Octal(info.st_mode))
                 .Because("Programs that do not run as root are told that nothing "
                          "is indexed.")
-                .Fix("Let everybody read it.",
+                .Fix("Let everyone read it.",
                      std::string("chmod ") + goodMode + " " + Quoted(path)));
     }
 }
@@ -96,10 +98,10 @@ void FindStrayFiles(Findings &findings, const std::string &directory, const std:
         if (!IsTemporary(name, prefix, suffix) || !look.IsRegular() || age < kSecondsOfAWriter) {
             continue;
         }
-        findings.push_back(
-            Warning("stray-file", path, Shown(path) + " was left behind " + Duration(age) + " ago")
-                .Because("A program was killed while it saved the file beside it.")
-                .Fix("Remove it.", "rm " + Quoted(path)));
+        findings.push_back(Warning("stray-file", path,
+                                   Shown(path) + " was left behind " + DurationText(age) + " ago")
+                               .Because("A program was killed while saving the file beside it.")
+                               .Fix("Remove it.", "rm " + Quoted(path)));
     }
 }
 

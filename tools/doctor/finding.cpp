@@ -64,14 +64,14 @@ Finding Error(std::string code, std::string subject, std::string what) {
 
 Finding Unreadable(std::string code, const std::string &path, int error) {
     if (IsForRootOnly(error)) {
-        return Unknown("needs-root", path, Shown(path) + " can be looked at by root only")
-            .Fix("Ask again as root.", "sudo fileindexctl doctor");
+        return Unknown("needs-root", path, Shown(path) + " can be checked by root only")
+            .Fix("Run it as root.", "sudo fileindexctl doctor");
     }
     // What reads files refuses other kinds so.
     const std::string what =
-        error == EINVAL ? " is no regular file" : " cannot be read: " + Reason(error);
+        error == EINVAL ? " is not a regular file" : " cannot be read: " + Reason(error);
     return Error(std::move(code), path, Shown(path) + what)
-        .Fix("Look at its kind, its owner and its mode.", "ls -ld " + Quoted(path));
+        .Fix("Check its type, owner and permissions.", "ls -ld " + Quoted(path));
 }
 
 std::string Quoted(const std::string &word) {
@@ -92,19 +92,6 @@ std::string Quoted(const std::string &word) {
 
 std::string ShowCommand(const std::string &folder) {
     return "fileindexctl show " + Quoted(folder);
-}
-
-std::string Duration(long long seconds) {
-    constexpr long long kHour = 3600;
-    constexpr long long kDay = 24 * kHour;
-    if (seconds < 60) {
-        return std::to_string(seconds) + " s";
-    }
-    if (seconds < 2 * kHour) {
-        return std::to_string(seconds / 60) + " min";
-    }
-    return seconds < 2 * kDay ? std::to_string(seconds / kHour) + " h"
-                              : std::to_string(seconds / kDay) + " days";
 }
 
 std::string Size(unsigned long long bytes) {

@@ -51,9 +51,6 @@ using Findings = std::vector<Finding>;
 // The command line that shows a folder's setting.
 [[nodiscard]] std::string ShowCommand(const std::string &folder);
 
-// "40 min", "3 h", "2 days": rounded down.
-[[nodiscard]] std::string Duration(long long seconds);
-
 // "512 bytes", "17 MiB".
 [[nodiscard]] std::string Size(unsigned long long bytes);
 

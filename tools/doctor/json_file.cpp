@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <json/reader.h>
+#include <unistd.h>
 
 #include "base/file_io.h"
 #include "base/json_io.h"
@@ -158,6 +159,19 @@ std::optional<Finding> MistakeOf(const JsonFile &file, const std::string &prefix
         finding.details["column"] = Json::UInt64(mistake.column);
     }
     return finding;
+}
+
+Finding MistakeOf(const VANO::PLATFORM::StoreFault &fault, const std::string &prefix) {
+    if (fault.kind == VANO::PLATFORM::StoreFault::Kind::kUnreadable) {
+        const int error = ::access(fault.file.c_str(), R_OK) == 0 ? 0 : errno;
+        return error == EACCES ? Unreadable(prefix + "-unreadable", fault.file, error)
+                               : Error(prefix + "-unreadable", fault.file,
+                                       Shown(fault.file) + " cannot be read: " + fault.reason);
+    }
+    const std::optional<Finding> mistake = MistakeOf(ReadJsonFile(fault.file), prefix);
+    return mistake ? *mistake
+                   : Error(prefix + "-shape", fault.file,
+                           Shown(fault.file) + " cannot be used: " + Shown(fault.reason));
 }
 
 } // namespace CTL::DOCTOR

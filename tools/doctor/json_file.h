@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <json/value.h>
 #include <optional>
+#include <platform/diagnosis.h>
 #include <string>
 #include <vector>
 
@@ -36,6 +37,9 @@ struct JsonFile {
 // What is wrong with a file that is unreadable or malformed; none otherwise. `prefix` begins the
 // finding's code: "<prefix>-unreadable", "<prefix>-malformed".
 [[nodiscard]] std::optional<Finding> MistakeOf(const JsonFile &file, const std::string &prefix);
+
+// The same of a file that the platform cannot use: "<prefix>-shape" where it is JSON.
+[[nodiscard]] Finding MistakeOf(const VANO::PLATFORM::StoreFault &fault, const std::string &prefix);
 
 } // namespace CTL::DOCTOR
 

@@ -1,30 +1,15 @@
 #include "state/asked_path.h"
 
-#include <array>
-#include <climits>
 #include <fileindex/share_path.h>
-#include <vano_platform.h>
 
-#include "state/share_record.h"
+#include "core/folder_cover.h"
+#include "core/share.h"
+#include "state/known_shares.h"
 #include "terminal/messages.h"
 
 namespace CTL {
 
-namespace {
-
 namespace fileindex = VANO::FILEINDEX;
-
-// The name of the share that a full path lies in; empty when it lies in none. Asks the platform,
-// since the library would write every no into the system log.
-std::string ShareOfFullPath(const std::string &fullPath) {
-    std::array<char, NAME_MAX * 2> name{};
-    std::array<char, PATH_MAX> inside{};
-    const int result = VANOShareNamePathGet(fullPath.c_str(), name.data(), name.size(),
-                                            inside.data(), inside.size());
-    return result < 0 ? "" : name.data();
-}
-
-} // namespace
 
 CLI::Option *AddPathsTo(CLI::App &app, std::vector<std::string> &paths, const char *description) {
     return app.add_option("PATH", paths, description)->required();
@@ -69,9 +54,11 @@ bool ToSharePath(std::string &sharePath, const std::string &asked) {
 }
 
 std::string SharePathOfFullPath(const std::string &fullPath) {
-    const std::string share = "/" + OwnNameOf(ShareOfFullPath(fullPath));
+    // Not through GetShareNamePathByFullPath(), which writes every no into the system log.
+    const auto found = fileindex::FindShareOfFullPath(fullPath);
+    const std::string share = "/" + (found ? OwnNameOf(found->name) : "");
     const std::string directory = ToFullPath(share);
-    if (directory.empty() || !fileindex::StringStartWith(fullPath + "/", directory + "/")) {
+    if (directory.empty() || !fileindex::IsSameOrBelow(fullPath, directory)) {
         return {};
     }
     return share + fullPath.substr(directory.size());

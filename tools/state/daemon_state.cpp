@@ -5,6 +5,8 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 
+#include "core/paths.h"
+
 namespace CTL {
 
 using VANO::FILEINDEX::UniqueFd;
@@ -12,7 +14,8 @@ using VANO::FILEINDEX::UniqueFd;
 int ConnectToDaemon(const UniqueFd &socket) {
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
-    std::memcpy(address.sun_path, kDaemonSocket, sizeof(kDaemonSocket));
+    std::memcpy(address.sun_path, VANO::FILEINDEX::kDaemonSocketPath,
+                sizeof(VANO::FILEINDEX::kDaemonSocketPath));
     return ::connect(socket.Get(), reinterpret_cast<const sockaddr *>(&address), sizeof(address)) ==
                    0
                ? 0

@@ -8,8 +8,6 @@
 
 namespace CTL {
 
-inline constexpr char kDaemonSocket[] = "/var/run/fileindexd.sock";
-
 // Connects a local socket to the daemon's: 0, or the errno.
 [[nodiscard]] int ConnectToDaemon(const VANO::FILEINDEX::UniqueFd &socket);
 

@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <iterator>
 
+#include "core/folder_cover.h"
+
 namespace CTL {
 
 using VANO::FILEINDEX::Folder;
@@ -50,11 +52,14 @@ std::vector<std::string> PathsOf(const std::vector<Folder> &folders) {
     return paths;
 }
 
-std::vector<Folder> Resolved(const std::vector<Folder> &folders) {
-    std::vector<Folder> resolved;
-    std::copy_if(folders.begin(), folders.end(), std::back_inserter(resolved),
-                 [](const Folder &folder) { return !folder.full_path.empty(); });
-    return resolved;
+Json::Value GoverningSetting(const std::string &fullPath, const std::vector<Folder> &folders) {
+    VANO::FILEINDEX::GoverningFolder governing(fullPath);
+    for (const Folder &folder : folders) {
+        if (!folder.full_path.empty()) { // the library would look for its share, and log
+            governing.Consider(folder);
+        }
+    }
+    return governing.AsJson();
 }
 
 bool IsSet(const std::string &path, const std::vector<Folder> &folders) {

@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "state/index_refusal.h"
+#include "state/refusal_text.h"
 
 namespace CTL {
 
@@ -29,9 +29,10 @@ inline constexpr std::array<const char *, 4> kFileTypes = {"document", "audio", 
 
 [[nodiscard]] std::vector<std::string> PathsOf(const std::vector<VANO::FILEINDEX::Folder> &folders);
 
-// Those whose share is there.
-[[nodiscard]] std::vector<VANO::FILEINDEX::Folder>
-Resolved(const std::vector<VANO::FILEINDEX::Folder> &folders);
+// The setting that governs a full path, an empty object when none does: of the folders whose share
+// is there.
+[[nodiscard]] Json::Value GoverningSetting(const std::string &fullPath,
+                                           const std::vector<VANO::FILEINDEX::Folder> &folders);
 
 [[nodiscard]] bool IsSet(const std::string &path,
                          const std::vector<VANO::FILEINDEX::Folder> &folders);

@@ -1,13 +1,15 @@
-#include "state/known_shares.h"
 
 #include <fileindex/index_mgr.h>
 #include <fileindex/share_path.h>
 #include <fileindex/status_mgr.h>
+#include <json/value.h>
 #include <map>
+#include <platform/diagnosis.h>
 
-#include "base/json_io.h"
-#include "state/share_record.h"
+#include "core/share.h"
+#include "state/known_shares.h"
 #include "state/status_file.h"
+#include "terminal/messages.h"
 
 namespace CTL {
 
@@ -24,11 +26,24 @@ MarkedShare WithMarks(KnownShare share) {
     return facts;
 }
 
-} // namespace
-
-std::set<std::string> NamesIn(const Json::Value &object) {
+// The members of an object whose names are shares'; none of another value.
+std::set<std::string> MembersOf(const Json::Value &object) {
     const auto names = object.isObject() ? object.getMemberNames() : Json::Value::Members();
     return {names.begin(), names.end()};
+}
+
+} // namespace
+
+std::string DirectoryOfShare(const std::string &name) {
+    const VANO::FILEINDEX::ShareRecord share = VANO::FILEINDEX::FindShare(name);
+    ForgetErrors();
+    return share ? share->path : "";
+}
+
+std::string OwnNameOf(const std::string &name) {
+    // Not the record's name, which may differ in case from the directory's.
+    const std::string directory = DirectoryOfShare(name);
+    return directory.substr(directory.rfind('/') + 1);
 }
 
 std::vector<KnownShare> SharesOf(const std::set<std::string> &names,
@@ -58,12 +73,12 @@ bool ListShares(std::vector<MarkedShare> &shares) {
     if (!IndexMgr::List(folders) || !LoadStatus(status)) {
         return false;
     }
-    // A table that is not there or is broken names no share; the platform then knows none either.
-    Json::Value table;
-    (void)VANO::FILEINDEX::JsonFromFile(table, kShareTable);
-    std::set<std::string> names = NamesIn(table);
-    names.merge(NamesIn(status["no_space"]));
-    names.merge(NamesIn(status["need_reindex"]));
+    std::set<std::string> names = MembersOf(status["no_space"]);
+    names.merge(MembersOf(status["need_reindex"]));
+    if (VANO::PLATFORM::ListShares != nullptr) {
+        const auto list = VANO::PLATFORM::ListShares();
+        names.insert(list.names.begin(), list.names.end());
+    }
     for (KnownShare &share : SharesOf(names, folders)) {
         shares.push_back(WithMarks(std::move(share)));
     }

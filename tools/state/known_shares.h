@@ -2,25 +2,25 @@
 #define FILEINDEXCTL_STATE_KNOWN_SHARES_H
 
 #include <fileindex/folder.h>
-#include <json/value.h>
 #include <set>
 #include <string>
 #include <vector>
 
 namespace CTL {
 
-// Where plain Linux has its shares. The platform finds shares by name and lists none.
-constexpr char kShareTable[] = "/usr/vano/etc/shares.json";
+// Where a share lies; empty when no share has that name. The last errors are cleared.
+[[nodiscard]] std::string DirectoryOfShare(const std::string &name);
+
+// The one spelling of a share's name with which its paths lead to its directory: the platform takes
+// any case, everybody else compares byte for byte. Empty when no share has that name. The last
+// errors are cleared.
+[[nodiscard]] std::string OwnNameOf(const std::string &name);
 
 struct KnownShare {
     std::string name;
     std::string directory; // empty when no share has that name
     std::vector<VANO::FILEINDEX::Folder> folders;
 };
-
-// The members of an object, such as the share table, whose names are shares'; none of another
-// value.
-[[nodiscard]] std::set<std::string> NamesIn(const Json::Value &object);
 
 // The shares of these names and those that the folders lie in, in byte order.
 [[nodiscard]] std::vector<KnownShare> SharesOf(const std::set<std::string> &names,
@@ -31,8 +31,8 @@ struct MarkedShare : KnownShare {
     bool needsReindex = false;
 };
 
-// Every share that has folder settings or marks, and those of the share table where the system has
-// one. False when the settings cannot be read.
+// Every share that has folder settings or marks, and those that the platform lists, where it does.
+// False when the settings cannot be read.
 [[nodiscard]] bool ListShares(std::vector<MarkedShare> &shares);
 
 // The name under which a share is kept that a user names: as typed where the settings or the marks

@@ -4,7 +4,9 @@
 #include <fileindex/index_rules.h>
 #include <fileindex/status_mgr.h>
 
-#include "state/share_record.h"
+#include "core/progress_words.h"
+#include "core/share_files.h"
+#include "state/known_shares.h"
 
 namespace CTL {
 
@@ -23,7 +25,7 @@ void ObservedShare::Prepare(std::vector<ObservedShare> &former) {
     if (directory.empty()) {
         return;
     }
-    queue_ = QueueIn(directory);
+    queue_ = fileindex::QueueIn(directory);
     for (ObservedShare &other : former) {
         if (other.counter_ && other.queue_ == queue_ && other.fullPaths_ == fullPaths_) {
             counter_ = std::move(other.counter_);
@@ -49,17 +51,17 @@ FolderState ObservedShare::StateOf(std::size_t folder, const ShareState &share,
     state.path = folders_[folder].path;
     state.isValid = isValid_[folder];
     if (share.pending) {
-        state.pending = counter_->EventsOf(folder);
+        state.pending = counter_->EventsOf(fullPaths_[folder]);
     }
-    // The answers of StatusMgr::GetFolderStatus(), which would read the queue once a folder.
+    // In the order of StatusMgr::GetFolderStatus(), which would read the queue once a folder.
     if (!state.isValid) {
-        state.status = "paused";
+        state.status = fileindex::kProgressPaused;
     } else if (isOutOfSpace_) {
-        state.status = "err_no_space";
+        state.status = fileindex::kProgressNoSpace;
     } else if (state.pending.value_or(0) == 0) {
-        state.status = "finished";
+        state.status = fileindex::kProgressFinished;
     } else {
-        state.status = isPaused ? "paused" : "processing";
+        state.status = isPaused ? fileindex::kProgressPaused : fileindex::kProgressProcessing;
     }
     return state;
 }

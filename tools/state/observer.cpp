@@ -7,6 +7,8 @@
 #include <fileindex/status.h>
 #include <fileindex/status_mgr.h>
 
+#include "core/folder_cover.h"
+
 namespace CTL {
 
 namespace {
@@ -18,10 +20,6 @@ constexpr std::chrono::seconds kSettingsLastFor{60};
 
 std::vector<FileStamp> StampSettings() {
     return {FileStamp(fileindex::Folders().GetPath()), FileStamp(fileindex::Status().GetPath())};
-}
-
-bool Contains(const std::string &above, const std::string &below) {
-    return fileindex::StringStartWith(below + "/", above + "/");
 }
 
 ObservedShare &ShareOf(std::vector<ObservedShare> &shares, const std::string &path) {
@@ -44,7 +42,8 @@ std::optional<long long> ReadResumeTime() {
 bool Observer::IsAsked(const std::string &path) const {
     return paths_.empty() ||
            std::any_of(paths_.begin(), paths_.end(), [&](const std::string &asked) {
-               return Contains(asked, path) || Contains(path, asked);
+               return fileindex::IsSameOrBelow(path, asked) ||
+                      fileindex::IsSameOrBelow(asked, path);
            });
 }
 

@@ -3,14 +3,14 @@
 #include <algorithm>
 #include <string_view>
 
+#include "core/paths.h"
+
 namespace CTL {
 
 namespace {
 
 constexpr std::size_t kChunkBytes = std::size_t{64} * 1024;
 constexpr std::size_t kRememberedBytes = 256;
-// A longer line is no event: the library, too, cuts it there.
-constexpr std::size_t kMaxLineBytes = VANO::FILEINDEX::kMaxJsonFileBytes;
 
 } // namespace
 
@@ -38,14 +38,14 @@ bool FileCount::Follow(const QueueFile &file, EventCounter &counter, Clock::time
         Take(chunk, counter);
     }
     if (isAtEnd && !isUnfinishedKnown_) {
-        unfinishedTally_ = EventTally();
+        unfinishedTally_ = EventCounts();
         counter.Count(unfinishedTally_, unfinished_);
         isUnfinishedKnown_ = true;
     }
     return isAtEnd;
 }
 
-void FileCount::AddTo(EventTally &sum) const {
+void FileCount::AddTo(EventCounts &sum) const {
     sum.Add(tally_);
     sum.Add(unfinishedTally_);
 }
@@ -67,7 +67,7 @@ void FileCount::Take(std::string_view chunk, EventCounter &counter) {
 }
 
 void FileCount::Append(std::string_view part) {
-    isCut_ = isCut_ || unfinished_.size() + part.size() > kMaxLineBytes;
+    isCut_ = isCut_ || unfinished_.size() + part.size() > VANO::FILEINDEX::kMaxEventBytes;
     if (isCut_) {
         unfinished_.clear(); // an empty line is no event
     } else {
@@ -81,7 +81,7 @@ QueueCounter::QueueCounter(std::string path, const std::vector<std::string> &fol
 bool QueueCounter::Look(Clock::time_point until) {
     // In this order a file that is being taken over is met twice, and not missed.
     QueueFile queue(path_);
-    const QueueFile taken(path_ + kTakenSuffix);
+    const QueueFile taken(path_ + VANO::FILEINDEX::kTakenQueueSuffix);
     if (queue.IsOpen() && taken.IsOpen() && queue.WhichFile() == taken.WhichFile()) {
         queue = QueueFile();
     }
@@ -91,7 +91,7 @@ bool QueueCounter::Look(Clock::time_point until) {
     }
     const bool isTakenDone = taken_.Follow(taken, counter_, until);
     const bool isQueueDone = queue_.Follow(queue, counter_, until);
-    sum_ = EventTally();
+    sum_ = EventCounts();
     queue_.AddTo(sum_);
     taken_.AddTo(sum_);
     error_ = queue.Error() != 0 ? queue.Error() : taken.Error();

@@ -7,25 +7,14 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "core/share_files.h"
+
 namespace CTL {
 
 using VANO::FILEINDEX::UniqueFd;
 
-std::string QueueIn(const std::string &directory) {
-    return directory + "/@eaDir/VANO@file_index_queue";
-}
-
-UniqueFd OpenQueue(const std::string &path, int flags) {
-    const std::size_t slash = path.rfind('/');
-    const UniqueFd directory(
-        ::open(path.substr(0, slash).c_str(), O_PATH | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
-    return UniqueFd(directory ? ::openat(directory.Get(), path.c_str() + slash + 1,
-                                         flags | O_NOFOLLOW | O_CLOEXEC)
-                              : -1);
-}
-
 QueueFile::QueueFile(const std::string &path)
-    : fd_(OpenQueue(path, O_RDONLY | O_NONBLOCK | O_NOCTTY)) {
+    : fd_(VANO::FILEINDEX::ShareFile(path).Open(O_RDONLY)) {
     struct stat info {};
     if (!fd_ || ::fstat(fd_.Get(), &info) != 0) {
         error_ = errno == ENOENT ? 0 : errno;

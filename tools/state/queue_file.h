@@ -12,18 +12,6 @@
 
 namespace CTL {
 
-// Beside a queue, the one that the daemon has taken over.
-inline constexpr char kTakenSuffix[] = ".tmp";
-
-// The path of the queue of a share that lies in `directory`. The library's own answer makes the
-// directory that holds the queue.
-[[nodiscard]] std::string QueueIn(const std::string &directory);
-
-// Opens what stands at the path of a queue. Users can write there: neither the directory that holds
-// it nor the queue itself may be a symbolic link; errno says why it could not be opened. With
-// O_PATH a link in the queue's own place is opened as what it is.
-[[nodiscard]] VANO::FILEINDEX::UniqueFd OpenQueue(const std::string &path, int flags);
-
 // A queue file, opened to be read, by its absolute path. Anything but a regular file is refused.
 class QueueFile {
   public:

@@ -2,6 +2,7 @@
 
 #include <cstring>
 
+#include "core/progress_words.h"
 #include "state/folder_view.h"
 #include "terminal/text.h"
 #include "terminal/times.h"
@@ -35,7 +36,7 @@ Json::Value JsonOf(const ShareState &share) {
 } // namespace
 
 bool ServiceState::IsPaused() const {
-    return resumeTime && CTL::IsPaused(*resumeTime, now);
+    return resumeTime && VANO::FILEINDEX::IsPaused(*resumeTime, now);
 }
 
 std::string PauseTextOf(const ServiceState &state) {

@@ -2,7 +2,12 @@
 
 #include <algorithm>
 
+#include "core/progress_words.h"
+
 namespace CTL {
+
+using VANO::FILEINDEX::IsPaused;
+using VANO::FILEINDEX::kPausedWithoutEnd;
 
 namespace {
 
@@ -112,10 +117,6 @@ std::string DurationText(long long seconds) {
         return Rounded(seconds, kMinute, "min");
     }
     return seconds < 2 * kDay ? Rounded(seconds, kHour, "h") : Rounded(seconds, kDay, "days");
-}
-
-bool IsPaused(long long resumeTime, std::time_t now) {
-    return resumeTime == kPausedWithoutEnd || resumeTime > static_cast<long long>(now);
 }
 
 std::string EndText(long long resumeTime, std::time_t now) {

@@ -14,16 +14,11 @@ namespace CTL {
 // Reads "07:30", the next time that the clock shows it, or "2026-11-22 07:30", in local time.
 [[nodiscard]] bool ReadMoment(std::time_t &moment, const std::string &text, std::time_t now);
 
-constexpr long long kPausedWithoutEnd = 0;
-
 // "45 s", "20 min", "6 h" or "3 days": one rounded number; what is negative counts as nothing.
 [[nodiscard]] std::string DurationText(long long seconds);
 
-// Whether indexing is paused at `now`. `resumeTime` is what StatusMgr::GetPauseInfo() gives.
-[[nodiscard]] bool IsPaused(long long resumeTime, std::time_t now);
-
-// Until when: "Sat 07:30" in local time, with the date where the day is not one of the next six, or
-// "resumed".
+// Until when a pause with this "resume_time" lasts: "Sat 07:30" in local time, with the date where
+// the day is not one of the next six, or "resumed".
 [[nodiscard]] std::string EndText(long long resumeTime, std::time_t now);
 
 // "paused until Sat 07:30, 6 h left", "paused until resumed" or "not paused".
