@@ -30,7 +30,7 @@ else
     echo "skipped for bash: bash-completion is not installed"
 fi
 
-export CMAKE_PREFIX_PATH=$prefix
+export CMAKE_PREFIX_PATH=$prefix CMAKE_GENERATOR=Ninja
 PKG_CONFIG_PATH=$(dirname "$(find "$prefix" -name fileindex.pc)")
 export PKG_CONFIG_PATH
 mkdir -p /usr/vano/etc/fileindex

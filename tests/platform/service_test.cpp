@@ -172,11 +172,13 @@ class SystemdTest : public ::testing::Test {
     void SetUp() override {
         MakeDirs("/run/systemd/system");
         PutSystemctl("none");
-        cover_ = std::make_unique<Mount>("/tmp/systemctl", "/usr/bin/systemctl", nullptr, MS_BIND);
-        ASSERT_TRUE(*cover_) << "systemctl cannot be replaced";
+        // Whether or not the machine has one.
+        programs_ = std::make_unique<Mount>("overlay", "/usr/bin", "overlay", MS_RDONLY,
+                                            "lowerdir=/tmp/programs:/usr/bin");
+        ASSERT_TRUE(*programs_) << "systemctl cannot be replaced";
     }
     void TearDown() override {
-        cover_.reset();
+        programs_.reset();
         RemoveTree("/run/systemd");
         RemoveTree("/etc/systemd/system/smb.service");
         RemoveTree("/etc/systemd/system/smbd.service");
@@ -185,12 +187,13 @@ class SystemdTest : public ::testing::Test {
 
     // It must never ask anybody for a password: the caller holds a lock meanwhile.
     static void PutSystemctl(const std::string &failing) {
-        PutProgram("/tmp/systemctl", std::string("[ \"$1\" = --no-ask-password ] || exit 9; shift\n"
+        MakeDirs("/tmp/programs");
+        PutProgram("/tmp/programs/systemctl", std::string("[ \"$1\" = --no-ask-password ] || exit 9; shift\n"
                                                  "echo \"$*\" >>") +
                                          kCalls + "\n[ \"$1\" != " + failing + " ]\n");
     }
 
-    std::unique_ptr<Mount> cover_;
+    std::unique_ptr<Mount> programs_;
 };
 
 TEST_F(SystemdTest, StartsStopsAndRestartsTheUnit) {
@@ -256,7 +259,6 @@ TEST_F(SystemdTest, AMaskHidesTheUnitOfThePackage) {
 }
 
 TEST_F(SystemdTest, WithoutSystemctlThereIsNoServiceControl) {
-    cover_.reset();
     PutFile("/tmp/empty", "");
     const Mount cover = Cover("/usr/bin/systemctl", "/tmp/empty");
     ASSERT_TRUE(cover);
