@@ -26,6 +26,18 @@ constexpr uid_t kOtherUser = 1234;
 
 class FileIoTest : public LibraryTest {
   protected:
+    // One byte a time, and a signal before the second one.
+    static void InterruptAndShorten(Call call) {
+        Fault::On(call, [calls = 0](CallInfo &info) mutable -> std::optional<long> {
+            if (++calls == 2) {
+                errno = EINTR;
+                return -1;
+            }
+            info.size = 1;
+            return std::nullopt;
+        });
+    }
+
     void SetUp() override {
         LibraryTest::SetUp();
         MakeDirs(kDirectory);
@@ -101,14 +113,7 @@ TEST_F(FileIoTest, ASocketIsNotRead) {
 
 TEST_F(FileIoTest, AnInterruptedOrShortReadGoesOn) {
     PutFile(kFile, "text");
-    Fault::On(Call::Read, [calls = 0](CallInfo &info) mutable -> std::optional<long> {
-        if (++calls == 2) {
-            errno = EINTR;
-            return -1;
-        }
-        info.size = 1;
-        return std::nullopt;
-    });
+    InterruptAndShorten(Call::Read);
     std::string read;
     EXPECT_TRUE(ReadFile(read, kFile, kNoLimit));
     EXPECT_EQ(read, "text");
@@ -132,20 +137,15 @@ TEST_F(FileIoTest, AFileThatGrowsIsReadToItsEnd) {
     }
 }
 
-TEST_F(FileIoTest, AFailingReadIsAFailure) {
+TEST_F(FileIoTest, AFailingReadOrFstatIsAFailure) {
     PutFile(kFile, "text");
-    Fault::Fail(Call::Read, EIO);
-    std::string read;
-    EXPECT_FALSE(ReadFile(read, kFile, kNoLimit));
-    EXPECT_EQ(errno, EIO);
-}
-
-TEST_F(FileIoTest, AFailingFstatIsAFailure) {
-    PutFile(kFile, "text");
-    Fault::Fail(Call::Fstat, EIO);
-    std::string read;
-    EXPECT_FALSE(ReadFile(read, kFile, kNoLimit));
-    EXPECT_EQ(errno, EIO);
+    for (const Call call : {Call::Read, Call::Fstat}) {
+        Fault::Fail(call, EIO);
+        std::string read;
+        EXPECT_FALSE(ReadFile(read, kFile, kNoLimit));
+        EXPECT_EQ(errno, EIO);
+        Fault::Reset();
+    }
 }
 
 // --- replacing ---
@@ -284,14 +284,7 @@ TEST_F(FileIoTest, FlushesTheTextBeforeTheRenameAndTheDirectoryAfterIt) {
 }
 
 TEST_F(FileIoTest, AnInterruptedOrShortWriteGoesOn) {
-    Fault::On(Call::Write, [calls = 0](CallInfo &info) mutable -> std::optional<long> {
-        if (++calls == 2) {
-            errno = EINTR;
-            return -1;
-        }
-        info.size = 1;
-        return std::nullopt;
-    });
+    InterruptAndShorten(Call::Write);
     EXPECT_TRUE(WriteFile(kFile, "text"));
     EXPECT_EQ(ReadText(kFile), "text");
 }

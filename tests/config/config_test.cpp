@@ -384,13 +384,8 @@ TEST_P(ConfigContentionTest, ALockedFileIsTriedThreeTimesWithASleepAfterEach) {
 }
 
 TEST_P(ConfigContentionTest, AnInterruptedAttemptIsRepeated) {
-    Fault::On(Call::Flock, [calls = 0](CallInfo &) mutable -> std::optional<long> {
-        if (++calls < 3) {
-            errno = EINTR;
-            return -1;
-        }
-        return std::nullopt;
-    });
+    Fault::FailWhen(Call::Flock, EINTR,
+                    [calls = 0](const CallInfo &) mutable { return ++calls < 3; });
     Fault::Quiet(Call::Usleep);
     Settings settings;
     EXPECT_TRUE(settings.Lock(GetParam()));

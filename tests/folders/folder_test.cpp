@@ -34,12 +34,16 @@ std::vector<bool> FlagsOf(const Folder &folder) {
     return {folder.document, folder.audio, folder.video, folder.photo};
 }
 
+// "path full_path name", and then the flags' first letters.
+std::string All(const Folder &folder) {
+    return folder.path + " " + folder.full_path + " " + folder.name + " " +
+           (folder.document ? "d" : "-") + (folder.audio ? "a" : "-") + (folder.video ? "v" : "-") +
+           (folder.photo ? "p" : "-");
+}
+
 TEST_F(FolderTest, ANewRecordIsEmptyAndIndexesNothing) {
     const Folder folder;
-    EXPECT_EQ(folder.full_path, "");
-    EXPECT_EQ(folder.path, "");
-    EXPECT_EQ(folder.name, "");
-    EXPECT_THAT(FlagsOf(folder), ElementsAre(false, false, false, false));
+    EXPECT_EQ(All(folder), "   ----");
 }
 
 // --- reading ---
@@ -48,10 +52,7 @@ TEST_F(FolderTest, LoadTakesEveryMember) {
     Folder folder;
     EXPECT_TRUE(folder.Load("/photos/a", Json(R"({"name":"A","document":true,"audio":false,
                                                  "video":true,"photo":true})")));
-    EXPECT_EQ(folder.path, "/photos/a");
-    EXPECT_EQ(folder.full_path, "/volume1/photos/a");
-    EXPECT_EQ(folder.name, "A");
-    EXPECT_THAT(FlagsOf(folder), ElementsAre(true, false, true, true));
+    EXPECT_EQ(All(folder), "/photos/a /volume1/photos/a A d-vp");
     ExpectError(FILEINDEX_ERR_NONE);
 }
 
@@ -71,10 +72,7 @@ TEST_F(FolderTest, EachFlagIsReadFromTheMemberOfItsName) {
 TEST_F(FolderTest, LoadKeepsWhatTheObjectLacks) {
     Folder folder = FullFolder();
     EXPECT_TRUE(folder.Load("/photos/a", Json("{}")));
-    EXPECT_EQ(folder.path, "/photos/a");
-    EXPECT_EQ(folder.full_path, "/volume1/photos/a");
-    EXPECT_EQ(folder.name, "Old");
-    EXPECT_THAT(FlagsOf(folder), ElementsAre(true, true, true, true));
+    EXPECT_EQ(All(folder), "/photos/a /volume1/photos/a Old davp");
     EXPECT_TRUE(folder.Load("/photos/a", Json(R"({"video":false})")));
     EXPECT_THAT(FlagsOf(folder), ElementsAre(true, true, false, true));
 }
@@ -108,10 +106,7 @@ TEST_F(FolderTest, ThePathComesFromTheCallerAndNeverFromTheObject) {
 TEST_F(FolderTest, AnUnresolvableFolderIsLoadedAllTheSame) {
     Folder folder = FullFolder();
     EXPECT_FALSE(folder.Load("/none/a", Json(R"({"name":"A","photo":false})")));
-    EXPECT_EQ(folder.path, "/none/a");
-    EXPECT_EQ(folder.full_path, "");
-    EXPECT_EQ(folder.name, "A");
-    EXPECT_THAT(FlagsOf(folder), ElementsAre(true, true, true, false));
+    EXPECT_EQ(All(folder), "/none/a  A dav-");
     ExpectError(FILEINDEX_ERR_PATH);
     ExpectLog({});
 }
@@ -129,10 +124,7 @@ TEST_F(FolderTest, AnEmptyPathLoadsWithThePathsOwnMessage) {
 TEST_F(FolderTest, ReloadStartsFromNothing) {
     Folder folder = FullFolder();
     EXPECT_TRUE(folder.Reload("/photos/a", Json("{}")));
-    EXPECT_EQ(folder.path, "/photos/a");
-    EXPECT_EQ(folder.full_path, "/volume1/photos/a");
-    EXPECT_EQ(folder.name, "");
-    EXPECT_THAT(FlagsOf(folder), ElementsAre(false, false, false, false));
+    EXPECT_EQ(All(folder), "/photos/a /volume1/photos/a  ----");
     EXPECT_TRUE(folder.Reload("/photos/a", Json(R"({"name":"A","audio":true})")));
     EXPECT_EQ(folder.name, "A");
     EXPECT_THAT(FlagsOf(folder), ElementsAre(false, true, false, false));
@@ -181,10 +173,7 @@ TEST_F(FolderTest, TheNewPathMayBeTheRecordsOwn) {
 TEST_F(FolderTest, SetPathResolvesAndLeavesTheRest) {
     Folder folder = FullFolder();
     EXPECT_TRUE(folder.SetPath("/photos/a"));
-    EXPECT_EQ(folder.path, "/photos/a");
-    EXPECT_EQ(folder.full_path, "/volume1/photos/a");
-    EXPECT_EQ(folder.name, "Old");
-    EXPECT_THAT(FlagsOf(folder), ElementsAre(true, true, true, true));
+    EXPECT_EQ(All(folder), "/photos/a /volume1/photos/a Old davp");
 }
 
 TEST_F(FolderTest, SetPathOfAnUnresolvablePathSetsThePathOnly) {

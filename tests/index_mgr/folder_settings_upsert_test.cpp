@@ -37,6 +37,14 @@ std::vector<std::string> AllSteps() {
             Changed(QueueOf(kVideo))};
 }
 
+std::vector<std::string> Numbered(int count) {
+    std::vector<std::string> paths;
+    for (int i = 0; i < count; ++i) {
+        paths.push_back("/photos/" + std::to_string(i));
+    }
+    return paths;
+}
+
 class UpsertTest : public IndexMgrTest {};
 
 TEST_F(UpsertTest, EveryPartyIsToldInOrderUnderTheLock) {
@@ -268,11 +276,7 @@ TEST_F(UpsertTest, PathsMayBeLongerThanTheSystemAllows) {
 }
 
 TEST_F(UpsertTest, TheThousandAndFirstFolderIsRefused) {
-    std::vector<std::string> paths;
-    for (int i = 0; i < 1000; ++i) {
-        paths.push_back("/photos/" + std::to_string(i));
-    }
-    PutFolders(paths);
+    PutFolders(Numbered(1000));
     const std::string before = ReadText(kFolderFile);
     EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/5","audio":true},
                                            {"path":"/photos/new"}])")));
@@ -284,11 +288,7 @@ TEST_F(UpsertTest, TheThousandAndFirstFolderIsRefused) {
 }
 
 TEST_F(UpsertTest, AThousandFoldersCanBeChanged) {
-    std::vector<std::string> paths;
-    for (int i = 0; i < 999; ++i) {
-        paths.push_back("/photos/" + std::to_string(i));
-    }
-    PutFolders(paths);
+    PutFolders(Numbered(999));
     platform.Answer("VLIBServiceStart", {-1, -1}); // far enough
     EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/new"}])")));
     EXPECT_FALSE(IndexMgr::Upsert(Json(R"([{"path":"/photos/5","audio":true}])")));
@@ -300,26 +300,31 @@ TEST_F(UpsertTest, AThousandFoldersCanBeChanged) {
 
 // --- bad elements -------------------------------------------------------------------------------
 
-struct BadElement {
-    const char *name;
-    const char *json;
-    std::vector<std::string> log;
-};
-
-class UpsertBadElementTest : public UpsertTest, public ::testing::WithParamInterface<BadElement> {};
-
-TEST_P(UpsertBadElementTest, IsABadParameterAndNothingIsSaved) {
+TEST_F(UpsertTest, ABadElementIsABadParameterAndNothingIsSaved) {
     PutFolders({"/photos/old"});
-    Json::Value request = TwoFolders();
-    request.append(Json(GetParam().json));
-    request.append(Json(R"({"path":"/music"})"));
     const DaemonPeer daemon;
-    Watch();
-    EXPECT_NO_THROW(EXPECT_FALSE(IndexMgr::Upsert(request)));
-    ExpectError(FILEINDEX_ERR_BAD_PARAM);
-    ExpectLog(GetParam().log);
-    EXPECT_THAT(Steps(), IsEmpty());
-    EXPECT_THAT(StoredPaths(), ElementsAre("/photos/old"));
+    for (const std::string element :
+         {"5", R"("/photos/x")", "null", "true", R"(["path"])", R"({"photo":true})",
+          R"({"path":5})", R"({"path":{"a":1}})", R"({"path":["/photos/x"]})", R"({"path":null})",
+          R"({"path":"/nowhere/x"})", R"({"path":"/volume1/photos/a"})",
+          R"({"path":"/photos\u0000x/a"})", // cut at the zero byte it would be the share photos
+          R"({"path":""})"}) {
+        SCOPED_TRACE(element);
+        Json::Value request = TwoFolders();
+        request.append(Json(element));
+        request.append(Json(R"({"path":"/music"})"));
+        Watch();
+        EXPECT_NO_THROW(EXPECT_FALSE(IndexMgr::Upsert(request)));
+        ExpectError(FILEINDEX_ERR_BAD_PARAM);
+        std::vector<std::string> log = {"folders:129 Bad param: " + element,
+                                        "index_mgr:* Upsert failed, folder=" + element};
+        if (element == R"({"path":""})") {
+            log.insert(log.begin(), "utils:389 GetShareNameByPath failed, path=");
+        }
+        ExpectLog(log);
+        EXPECT_THAT(Steps(), IsEmpty());
+        EXPECT_THAT(StoredPaths(), ElementsAre("/photos/old"));
+    }
 }
 
 TEST_F(UpsertTest, AHoleInTheRequestIsABadElement) {
@@ -330,65 +335,6 @@ TEST_F(UpsertTest, AHoleInTheRequestIsABadElement) {
     ExpectLog({"folders:129 Bad param: null", "index_mgr:* Upsert failed, folder=null"});
     EXPECT_FALSE(Exists(kFolderFile));
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Rows, UpsertBadElementTest,
-    ::testing::Values(
-        BadElement{
-            "Number", "5", {"folders:129 Bad param: 5", "index_mgr:* Upsert failed, folder=5"}},
-        BadElement{"Text",
-                   R"("/photos/x")",
-                   {R"(folders:129 Bad param: "/photos/x")",
-                    R"(index_mgr:* Upsert failed, folder="/photos/x")"}},
-        // Cut at the zero byte it would be the share photos.
-        BadElement{"ZeroByteInTheShareName",
-                   R"({"path":"/photos\u0000x/a"})",
-                   {R"(folders:129 Bad param: {"path":"/photos\u0000x/a"})",
-                    R"(index_mgr:* Upsert failed, folder={"path":"/photos\u0000x/a"})"}},
-        BadElement{"Null",
-                   "null",
-                   {"folders:129 Bad param: null", "index_mgr:* Upsert failed, folder=null"}},
-        BadElement{"True",
-                   "true",
-                   {"folders:129 Bad param: true", "index_mgr:* Upsert failed, folder=true"}},
-        BadElement{"Array",
-                   R"(["path"])",
-                   {R"(folders:129 Bad param: ["path"])",
-                    R"(index_mgr:* Upsert failed, folder=["path"])"}},
-        BadElement{"NoPath",
-                   R"({"photo":true})",
-                   {R"(folders:129 Bad param: {"photo":true})",
-                    R"(index_mgr:* Upsert failed, folder={"photo":true})"}},
-        BadElement{"NumberAsPath",
-                   R"({"path":5})",
-                   {R"(folders:129 Bad param: {"path":5})",
-                    R"(index_mgr:* Upsert failed, folder={"path":5})"}},
-        BadElement{"ObjectAsPath",
-                   R"({"path":{"a":1}})",
-                   {R"(folders:129 Bad param: {"path":{"a":1}})",
-                    R"(index_mgr:* Upsert failed, folder={"path":{"a":1}})"}},
-        BadElement{"ArrayAsPath",
-                   R"({"path":["/photos/x"]})",
-                   {R"(folders:129 Bad param: {"path":["/photos/x"]})",
-                    R"(index_mgr:* Upsert failed, folder={"path":["/photos/x"]})"}},
-        BadElement{"NullAsPath",
-                   R"({"path":null})",
-                   {R"(folders:129 Bad param: {"path":null})",
-                    R"(index_mgr:* Upsert failed, folder={"path":null})"}},
-        BadElement{
-            "EmptyPath",
-            R"({"path":""})",
-            {"utils:389 GetShareNameByPath failed, path=", R"(folders:129 Bad param: {"path":""})",
-             R"(index_mgr:* Upsert failed, folder={"path":""})"}},
-        BadElement{"UnknownShare",
-                   R"({"path":"/nowhere/x"})",
-                   {R"(folders:129 Bad param: {"path":"/nowhere/x"})",
-                    R"(index_mgr:* Upsert failed, folder={"path":"/nowhere/x"})"}},
-        BadElement{"FullPath",
-                   R"({"path":"/volume1/photos/a"})",
-                   {R"(folders:129 Bad param: {"path":"/volume1/photos/a"})",
-                    R"(index_mgr:* Upsert failed, folder={"path":"/volume1/photos/a"})"}}),
-    NameOfRow());
 
 TEST_F(UpsertTest, FieldsOfAnotherTypeAreNoBadElements) {
     PutFile(kFolderFile, R"({"/photos/a":{"name":"Mine","photo":true}})");

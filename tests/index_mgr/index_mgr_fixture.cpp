@@ -216,6 +216,22 @@ void IndexMgrTest::ExpectFailure(const FailingStep &row, const std::function<boo
     Fault::Reset();
 }
 
+void IndexMgrTest::ExpectSuccess(const ServiceFailure &row, const std::function<bool()> &operation,
+                                 const std::vector<std::string> &laterSteps) {
+    PutFolders({"/photos/a"});
+    platform.spotlight = true;
+    SetPlatformError();
+    platform.AnswerAlways(row.function, -1);
+    Watch();
+    EXPECT_TRUE(operation());
+    ExpectLog({std::string("index_mgr:* ") + row.function + " failed: err=[0x00AB service.c:77]"});
+    ExpectError(FILEINDEX_ERR_NONE);
+    std::vector<std::string> expected = {Changed(kFolderFile)};
+    expected.insert(expected.end(), row.services.begin(), row.services.end());
+    expected.insert(expected.end(), laterSteps.begin(), laterSteps.end());
+    EXPECT_EQ(Steps(), expected);
+}
+
 void IndexMgrTest::WatchLockAt(const std::vector<std::string> &platformFunctions,
                                const std::vector<Call> &calls) {
     const auto look = [this](const std::string &what) {

@@ -113,6 +113,11 @@ class IndexMgrTest : public LibraryTest {
     void ExpectFailure(const FailingStep &row, const std::function<bool()> &operation,
                        std::vector<std::string> allSteps = {});
 
+    // The operation, which removes the last folder, "/photos/a", succeeds although the service
+    // cannot be stopped; it does these steps after those for the services.
+    void ExpectSuccess(const ServiceFailure &row, const std::function<bool()> &operation,
+                       const std::vector<std::string> &laterSteps = {});
+
     // From now on notes of every such call whether the lock on the folder settings is held; of
     // writes only those to the queue of photos count.
     void WatchLockAt(const std::vector<std::string> &platformFunctions,

@@ -415,13 +415,7 @@ TEST_F(ProgressTest, AnEmptyQueueHoldsNothing) {
 
 TEST_F(ProgressTest, AReadErrorEndsTheQueue) {
     PutFile(kPhotoQueue, kWaiting);
-    Fault::On(Call::Read, [](CallInfo &info) -> std::optional<long> {
-        if (info.path != kPhotoQueue) {
-            return std::nullopt;
-        }
-        errno = EIO;
-        return -1;
-    });
+    Fault::FailPath(Call::Read, kPhotoQueue, EIO);
     EXPECT_EQ(StatusOf(), "finished");
     ExpectLog({});
 }

@@ -214,12 +214,8 @@ TEST_F(StatusMgrTest, AMarkOfAnotherShapeThrowsWithTheLockReleased) {
 
 TEST_F(StatusMgrTest, ALockThatComesFreeIsTaken) {
     int attempts = 0;
-    Fault::On(Call::Flock, [&](CallInfo &info) -> std::optional<long> {
-        if ((info.number & LOCK_EX) == 0 || ++attempts == 3) {
-            return std::nullopt;
-        }
-        errno = EAGAIN;
-        return -1;
+    Fault::FailWhen(Call::Flock, EAGAIN, [&](const CallInfo &info) {
+        return (info.number & LOCK_EX) != 0 && ++attempts != 3;
     });
     EXPECT_TRUE(StatusMgr::SetUpdated("step"));
     EXPECT_EQ(attempts, 3);

@@ -76,24 +76,13 @@ void EventTrace::AddPolled(std::string entry) {
     state.entries.push_back({std::move(entry), false});
 }
 
-std::vector<std::string> EventTrace::Entries() {
+std::vector<std::string> EventTrace::Texts(bool queriesToo) {
     Poll();
     State &state = GetState();
     const std::lock_guard<std::mutex> lock(state.mutex);
     std::vector<std::string> texts;
     for (const Entry &entry : state.entries) {
-        texts.push_back(entry.text);
-    }
-    return texts;
-}
-
-std::vector<std::string> EventTrace::Effects() {
-    Poll();
-    State &state = GetState();
-    const std::lock_guard<std::mutex> lock(state.mutex);
-    std::vector<std::string> texts;
-    for (const Entry &entry : state.entries) {
-        if (!entry.query) {
+        if (queriesToo || !entry.query) {
             texts.push_back(entry.text);
         }
     }

@@ -36,8 +36,8 @@ class EventTrace {
     void AddPolled(std::string entry);
 
     // All entries, and those that are no queries.
-    std::vector<std::string> Entries();
-    std::vector<std::string> Effects();
+    std::vector<std::string> Entries() { return Texts(true); }
+    std::vector<std::string> Effects() { return Texts(false); }
 
     // Forgets the entries and the watched files.
     void Clear();
@@ -55,6 +55,8 @@ class EventTrace {
 
   private:
     EventTrace() = default;
+
+    std::vector<std::string> Texts(bool queriesToo);
 };
 
 // While it lives, this thread's system calls and polls belong to the test kit: no faults, no

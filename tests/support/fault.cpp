@@ -130,11 +130,6 @@ void SetHook(Call call, Fault::Hook hook) {
     g_active[Index(call)].store(true, std::memory_order_release);
 }
 
-std::optional<long> Failed(int error) {
-    errno = error;
-    return -1;
-}
-
 bool EndsWith(const std::string &text, const std::string &suffix) {
     return text.size() >= suffix.size() &&
            text.compare(text.size() - suffix.size(), suffix.size(), suffix) == 0;
@@ -166,20 +161,26 @@ std::string CallInfo::Name() const {
     return kForms[Index(call)].name;
 }
 
-void Fault::Fail(Call call, int error, int nth) {
-    SetHook(call, [error, left = nth](CallInfo &) mutable {
-        return --left == 0 ? Failed(error) : std::nullopt;
+void Fault::FailWhen(Call call, int error, std::function<bool(const CallInfo &)> isMeant) {
+    SetHook(call, [error, isMeant = std::move(isMeant)](CallInfo &info) -> std::optional<long> {
+        if (!isMeant(info)) {
+            return std::nullopt;
+        }
+        errno = error;
+        return -1;
     });
+}
+
+void Fault::Fail(Call call, int error, int nth) {
+    FailWhen(call, error, [left = nth](const CallInfo &) mutable { return --left == 0; });
 }
 
 void Fault::FailAlways(Call call, int error) {
-    SetHook(call, [error](CallInfo &) { return Failed(error); });
+    FailWhen(call, error, [](const CallInfo &) { return true; });
 }
 
 void Fault::FailPath(Call call, const std::string &suffix, int error) {
-    SetHook(call, [suffix, error](CallInfo &info) {
-        return EndsWith(info.path, suffix) ? Failed(error) : std::nullopt;
-    });
+    FailWhen(call, error, [suffix](const CallInfo &info) { return EndsWith(info.path, suffix); });
 }
 
 void Fault::Return(Call call, const std::vector<long> &results) {

@@ -83,6 +83,7 @@ class Fault {
 
     static void Fail(Call call, int error, int nth = 1);
     static void FailAlways(Call call, int error);
+    static void FailWhen(Call call, int error, std::function<bool(const CallInfo &)> isMeant);
     static void FailPath(Call call, const std::string &suffix, int error);
     static void Return(Call call, const std::vector<long> &results);
     static void Quiet(Call call);

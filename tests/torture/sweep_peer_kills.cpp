@@ -53,6 +53,12 @@ void WorkOff() {
     (void)::close(record);
 }
 
+void WatchedWorkOff() {
+    WatchBegins();
+    WorkOff();
+    WatchEnds();
+}
+
 std::string CheckHandled() {
     if (IsLocked(Queue()) || Exists(Queue()) || Exists(Queue() + ".tmp")) {
         return "the queue is not worked off";
@@ -72,12 +78,7 @@ std::string KillPeer(int takenOver, int index) {
     hooks.onEntry = [&](const SystemCall &call) {
         return call.index == index ? Decision{Action::kKill, 0, true} : Decision{};
     };
-    const auto body = [] {
-        WatchBegins();
-        WorkOff();
-        WatchEnds();
-    };
-    (void)RunTraced(body, hooks, kLimit);
+    (void)RunTraced(WatchedWorkOff, hooks, kLimit);
     (void)RunForked(WorkOff, kLimit);
     return CheckHandled();
 }
@@ -90,12 +91,7 @@ int CountCalls(int takenOver) {
         ++calls;
         return Decision{};
     };
-    const auto body = [] {
-        WatchBegins();
-        WorkOff();
-        WatchEnds();
-    };
-    (void)RunTraced(body, hooks, kLimit);
+    (void)RunTraced(WatchedWorkOff, hooks, kLimit);
     return calls;
 }
 

@@ -49,12 +49,8 @@ class EventQueueTest : public LibraryTest {
 
     // The lock on the queue fails that often; the status file's is left alone.
     static void FailQueueLock(int times, int error) {
-        Fault::On(Call::Flock, [times, error](CallInfo &info) mutable -> std::optional<long> {
-            if (info.path != kPhotoQueue || (info.number & LOCK_EX) == 0 || times-- <= 0) {
-                return std::nullopt;
-            }
-            errno = error;
-            return -1;
+        Fault::FailWhen(Call::Flock, error, [times](const CallInfo &info) mutable {
+            return info.path == kPhotoQueue && (info.number & LOCK_EX) != 0 && times-- > 0;
         });
     }
 
@@ -262,12 +258,8 @@ TEST_F(EventQueueTest, AQueueThatCannotBeReadIsLoggedAndAppendedTo) {
     for (const std::string queue : {kPhotoQueue, kPhotoTaken}) {
         RemoveTree(kPhotoQueue);
         PutFile(queue, covered);
-        Fault::On(Call::Open, [queue](CallInfo &info) -> std::optional<long> {
-            if (info.path != queue || (info.number & O_ACCMODE) != O_RDONLY) {
-                return std::nullopt;
-            }
-            errno = EACCES;
-            return -1;
+        Fault::FailWhen(Call::Open, EACCES, [queue](const CallInfo &info) {
+            return info.path == queue && (info.number & O_ACCMODE) == O_RDONLY;
         });
         EXPECT_TRUE(AddTrip());
         ExpectLog({"utils:95 Failed to open queue=" + queue + ", reason=Permission denied"});
@@ -458,10 +450,7 @@ TEST_F(EventQueueTest, TheReasonOfTheDropIsTheLastLocks) {
     LOG_LEVEL = 7;
     FailQueueLock(3, EINTR);
     // What comes between the lock and the message may fail for other reasons.
-    Fault::On(Call::Usleep, [](CallInfo &) {
-        errno = EINVAL;
-        return -1;
-    });
+    Fault::FailAlways(Call::Usleep, EINVAL);
     EXPECT_TRUE(AddTrip());
     ExpectLog({std::string("utils:516 try lock too many times, path=") + kPhotoQueue +
                ", reason=Interrupted system call"});
@@ -516,12 +505,8 @@ TEST_F(EventQueueTest, AQueueThatCannotBeOpenedAgainMarksTheShareWithoutAMessage
     LOG_LEVEL = 7;
     Fault::Quiet(Call::Usleep);
     FailQueueLock(1, EAGAIN);
-    Fault::On(Call::Open, [opened = 0](CallInfo &info) mutable -> std::optional<long> {
-        if (info.path != kPhotoQueue || ++opened == 1) {
-            return std::nullopt;
-        }
-        errno = EMFILE;
-        return -1;
+    Fault::FailWhen(Call::Open, EMFILE, [opened = 0](const CallInfo &info) mutable {
+        return info.path == kPhotoQueue && ++opened > 1;
     });
     EXPECT_FALSE(AddTrip());
     EXPECT_EQ(QueueCalls(Call::Open), 2U);
@@ -555,10 +540,7 @@ TEST_F(EventQueueTest, AShortWriteCountsAsDone) {
         RemoveTree(kPhotoQueue);
         Fault::Reset();
         Fault::Record(Call::Flock);
-        Fault::On(Call::Write, [](CallInfo &info) -> std::optional<long> {
-            info.size = 5;
-            return std::nullopt;
-        });
+        Fault::Before(Call::Write, [](CallInfo &info) { info.size = 5; });
         EXPECT_TRUE(AddTrip());
         EXPECT_EQ(ReadText(kPhotoQueue), std::string(kTripLine).substr(0, 5));
         EXPECT_EQ(Fault::Calls(Call::Write), 1U) << "one write, whatever it does";
