@@ -58,6 +58,7 @@ void FakePlatform::Reset() {
     lastErrorFile.clear();
     lastErrorLine = 0;
     monitorCalls.clear();
+    quiet = false;
 }
 
 FakeShare &FakePlatform::AddShare(const std::string &name, const std::string &path) {
@@ -85,6 +86,21 @@ FakeShare *FakePlatform::FindShare(const std::string &name) {
         }
     }
     return nullptr;
+}
+
+FakeShare *FakePlatform::FindShareOfPath(std::string_view fullPath) {
+    const Lock lock(Mutex());
+    FakeShare *found = nullptr;
+    for (FakeShare &share : shares_) {
+        const std::size_t size = share.path.size();
+        // Shares may lie in one another: the deepest counts.
+        if (fullPath.substr(0, size) == share.path &&
+            (fullPath.size() == size || fullPath[size] == '/') &&
+            (found == nullptr || size > found->path.size())) {
+            found = &share;
+        }
+    }
+    return found;
 }
 
 void FakePlatform::Answer(const std::string &function, const std::vector<int> &results) {
@@ -146,7 +162,9 @@ void FakePlatform::Violation(const std::string &text) {
 
 void FakePlatform::AddMonitorCall(MonitorCall call) {
     const Lock lock(Mutex());
-    monitorCalls.push_back(std::move(call));
+    if (!quiet) {
+        monitorCalls.push_back(std::move(call));
+    }
 }
 
 std::optional<int> FakePlatform::Enter(const std::string &function, const std::string &arguments,
@@ -199,28 +217,53 @@ void FakePlatform::FreeRecord(_tag_VANOSHARE *record) {
 namespace {
 
 constexpr bool kQuery = true;
+constexpr bool kEffect = false;
 
 std::string Text(const char *text) {
     return text != nullptr ? text : "(null)";
 }
 
-std::string NameOf(const _tag_VANOSHARE *share) {
+std::string Text(const _tag_VANOSHARE *share) {
     return share != nullptr ? Text(share->name) : "(null)";
 }
 
+std::string Text(long long number) {
+    return std::to_string(number);
+}
+
+std::string Text(const Json::Value &value) {
+    return CompactText(value);
+}
+
+const std::string &Text(const std::string &text) {
+    return text;
+}
+
+// A call with its arguments, which become text only when calls are recorded.
+template <typename... Arguments>
+std::optional<int> Enter(const char *function, bool query, const Arguments &...arguments) {
+    FakePlatform &platform = FakePlatform::Get();
+    if (platform.quiet) {
+        return std::nullopt;
+    }
+    std::string text;
+    [[maybe_unused]] const char *separator = "";
+    ((text += separator + Text(arguments), separator = ", "), ...);
+    return platform.Enter(function, text, query);
+}
+
 // Copies as snprintf does; the platform's buffers are always terminated.
-void CopyOut(char *out, int size, const std::string &text) {
+void CopyOut(char *out, int size, const char *text) {
     if (out != nullptr && size > 0) {
-        std::snprintf(out, static_cast<std::size_t>(size), "%s", text.c_str());
+        std::snprintf(out, static_cast<std::size_t>(size), "%s", text);
     }
 }
 
 int ShareFlag(const char *function, _tag_VANOSHARE *share, int *flag, bool FakeShare::*member) {
-    FakePlatform &platform = FakePlatform::Get();
-    if (const auto answer = platform.Enter(function, NameOf(share), kQuery)) {
+    if (const auto answer = Enter(function, kQuery, share)) {
         return *answer;
     }
-    const FakeShare *found = platform.FindShare(NameOf(share));
+    const FakeShare *found = FakePlatform::Get().FindShare(Text(share));
     if (found == nullptr) {
         return -1;
     }
@@ -229,12 +272,8 @@ int ShareFlag(const char *function, _tag_VANOSHARE *share, int *flag, bool FakeS
 }
 
 int IsAmong(const char *function, const char *text, const std::set<std::string> &texts) {
-    const auto answer = FakePlatform::Get().Enter(function, Text(text), kQuery);
+    const auto answer = Enter(function, kQuery, text);
     return answer ? *answer : static_cast<int>(texts.count(Text(text)));
-}
-
-int Simple(const char *function, const std::string &arguments, int result = 0) {
-    return FakePlatform::Get().Enter(function, arguments).value_or(result);
 }
 
 } // namespace
@@ -245,7 +284,7 @@ using namespace VANO::TESTS;
 
 int VANOShareGet(const char *name, _tag_VANOSHARE **share) {
     FakePlatform &platform = FakePlatform::Get();
-    const auto answer = platform.Enter("VANOShareGet", Text(name), kQuery);
+    const auto answer = Enter("VANOShareGet", kQuery, name);
     const FakeShare *found = platform.FindShare(Text(name));
     if (answer.value_or(0) < 0 || found == nullptr) {
         return answer.value_or(-1);
@@ -259,31 +298,23 @@ void VANOShareFree(_tag_VANOSHARE *share) {
         FakePlatform::Get().Violation("VANOShareFree of a null record");
         return;
     }
-    (void)FakePlatform::Get().Enter("VANOShareFree", NameOf(share), kQuery);
+    (void)Enter("VANOShareFree", kQuery, share);
     FakePlatform::Get().FreeRecord(share);
 }
 
 int VANOShareNamePathGet(const char *fullPath, char *name, int nameSize, char *path, int pathSize) {
-    FakePlatform &platform = FakePlatform::Get();
-    const std::string full = Text(fullPath);
-    const auto answer = platform.Enter(
-        "VANOShareNamePathGet",
-        full + ", " + std::to_string(nameSize) + ", " + std::to_string(pathSize), kQuery);
-    if (answer) {
+    if (const auto answer = Enter("VANOShareNamePathGet", kQuery, fullPath, nameSize, pathSize)) {
         return *answer;
     }
     // "/volume1/photos/a" lies in the share at "/volume1/photos".
-    for (std::size_t end = full.size(); end != 0 && end != std::string::npos;
-         end = full.rfind('/', end - 1)) {
-        const std::string directory = full.substr(0, end);
-        const FakeShare *share = platform.FindShare(directory.substr(directory.rfind('/') + 1));
-        if (share != nullptr && share->path == directory) {
-            CopyOut(name, nameSize, share->name);
-            CopyOut(path, pathSize, full.substr(end));
-            return 0;
-        }
+    const FakeShare *share =
+        fullPath != nullptr ? FakePlatform::Get().FindShareOfPath(fullPath) : nullptr;
+    if (share == nullptr) {
+        return -1;
     }
-    return -1;
+    CopyOut(name, nameSize, share->name.c_str());
+    CopyOut(path, pathSize, fullPath + share->path.size());
+    return 0;
 }
 
 int VLIBShareIsEncryptedGet(_tag_VANOSHARE *share, int *flag) {
@@ -303,9 +334,7 @@ int VANOEAIsHiddenDir(const char *name) {
 }
 
 int VANOEAMKDir(int flags, const char *path) {
-    const auto answer =
-        FakePlatform::Get().Enter("VANOEAMKDir", std::to_string(flags) + ", " + Text(path));
-    if (answer) {
+    if (const auto answer = Enter("VANOEAMKDir", kEffect, flags, path)) {
         return *answer;
     }
     const KitScope kit;
@@ -313,21 +342,17 @@ int VANOEAMKDir(int flags, const char *path) {
 }
 
 int VANOGetFSType(const char *path, int flags) {
-    FakePlatform &platform = FakePlatform::Get();
-    return platform.Enter("VANOGetFSType", Text(path) + ", " + std::to_string(flags), kQuery)
-        .value_or(platform.fileSystemType);
+    return Enter("VANOGetFSType", kQuery, path, flags).value_or(FakePlatform::Get().fileSystemType);
 }
 
 int VANOFSIsRemoteFS(int type) {
-    FakePlatform &platform = FakePlatform::Get();
-    return platform.Enter("VANOFSIsRemoteFS", std::to_string(type), kQuery)
-        .value_or(type == platform.remoteType ? 1 : 0);
+    return Enter("VANOFSIsRemoteFS", kQuery, type)
+        .value_or(type == FakePlatform::Get().remoteType ? 1 : 0);
 }
 
 int VANOFSIsImageFS(int type) {
-    FakePlatform &platform = FakePlatform::Get();
-    return platform.Enter("VANOFSIsImageFS", std::to_string(type), kQuery)
-        .value_or(type == platform.imageType ? 1 : 0);
+    return Enter("VANOFSIsImageFS", kQuery, type)
+        .value_or(type == FakePlatform::Get().imageType ? 1 : 0);
 }
 
 int VANOShareIsShareRecycle(const char *fullPath) {
@@ -335,10 +360,9 @@ int VANOShareIsShareRecycle(const char *fullPath) {
 }
 
 int VLIBFhsPathInSnapshot(const char *fullPath, int *flag) {
-    FakePlatform &platform = FakePlatform::Get();
     // With an answer too the flag is set, so that a failing probe can be told from a "no".
-    *flag = static_cast<int>(platform.snapshotPaths.count(Text(fullPath)));
-    return platform.Enter("VLIBFhsPathInSnapshot", Text(fullPath), kQuery).value_or(0);
+    *flag = static_cast<int>(FakePlatform::Get().snapshotPaths.count(Text(fullPath)));
+    return Enter("VLIBFhsPathInSnapshot", kQuery, fullPath).value_or(0);
 }
 
 int VANOFSDirIsMntPoint(const char *fullPath) {
@@ -346,23 +370,19 @@ int VANOFSDirIsMntPoint(const char *fullPath) {
 }
 
 int VANOQuotaIsEnough(int reserved, const char *dir, long long bytes) {
-    FakePlatform &platform = FakePlatform::Get();
-    return platform
-        .Enter("VANOQuotaIsEnough",
-               std::to_string(reserved) + ", " + Text(dir) + ", " + std::to_string(bytes), kQuery)
-        .value_or(platform.quotaIsEnough ? 1 : 0);
+    return Enter("VANOQuotaIsEnough", kQuery, reserved, dir, bytes)
+        .value_or(FakePlatform::Get().quotaIsEnough ? 1 : 0);
 }
 
 int VLIBCErrGet(void) {
-    FakePlatform &platform = FakePlatform::Get();
-    return platform.Enter("VLIBCErrGet", "", kQuery).value_or(platform.lastError);
+    return Enter("VLIBCErrGet", kQuery).value_or(FakePlatform::Get().lastError);
 }
 
 void VLIBCErrSetEx(int code, const char *file, int line) {
     FakePlatform &platform = FakePlatform::Get();
     char hex[16];
     std::snprintf(hex, sizeof(hex), "0x%04X", static_cast<unsigned>(code));
-    (void)platform.Enter("VLIBCErrSetEx", hex);
+    (void)Enter("VLIBCErrSetEx", kEffect, hex);
     platform.lastError = code;
     platform.lastErrorFile = Text(file);
     platform.lastErrorLine = line;
@@ -377,17 +397,15 @@ int VLIBCErrorGetLine(void) {
 }
 
 int VLIBCUnicodeUTF8StrCaseCmp(const char *a, const char *b) {
-    return FakePlatform::Get()
-        .Enter("VLIBCUnicodeUTF8StrCaseCmp", Text(a) + ", " + Text(b), kQuery)
-        .value_or(::strcasecmp(a, b));
+    return Enter("VLIBCUnicodeUTF8StrCaseCmp", kQuery, a, b).value_or(::strcasecmp(a, b));
 }
 
 int VLIBCExecv(const char *path, const char *const *argv, int wait) {
-    std::string arguments = Text(path) + ", [";
+    std::string arguments = "[";
     for (std::size_t i = 0; argv != nullptr && argv[i] != nullptr; ++i) {
         arguments += (i == 0 ? "" : ", ") + std::string(argv[i]);
     }
-    return Simple("VLIBCExecv", arguments + "], " + std::to_string(wait));
+    return Enter("VLIBCExecv", kEffect, path, arguments + "]", wait).value_or(0);
 }
 
 int VLIBCExec(const char *path, ...) {
@@ -402,29 +420,28 @@ int VLIBCExec(const char *path, ...) {
     if (!ended) {
         FakePlatform::Get().Violation("VLIBCExec without its second null argument");
     }
-    return Simple("VLIBCExec", arguments);
+    return Enter("VLIBCExec", kEffect, arguments).value_or(0);
 }
 
 int VLIBServiceStart(const char *name, int flag) {
-    return Simple("VLIBServiceStart", Text(name) + ", " + std::to_string(flag));
+    return Enter("VLIBServiceStart", kEffect, name, flag).value_or(0);
 }
 
 int VLIBServiceStop(const char *name, int flag) {
-    return Simple("VLIBServiceStop", Text(name) + ", " + std::to_string(flag));
+    return Enter("VLIBServiceStop", kEffect, name, flag).value_or(0);
 }
 
 int VLIBServiceRestart(const char *name) {
-    return Simple("VLIBServiceRestart", Text(name));
+    return Enter("VLIBServiceRestart", kEffect, name).value_or(0);
 }
 
 int VANOSMBIsEnableSpotlight(void) {
-    FakePlatform &platform = FakePlatform::Get();
-    return platform.Enter("VANOSMBIsEnableSpotlight", "", kQuery)
-        .value_or(platform.spotlight ? 1 : 0);
+    return Enter("VANOSMBIsEnableSpotlight", kQuery)
+        .value_or(FakePlatform::Get().spotlight ? 1 : 0);
 }
 
 int VANOSMBSetSpotlight(bool enable) {
-    const auto answer = FakePlatform::Get().Enter("VANOSMBSetSpotlight", enable ? "true" : "false");
+    const auto answer = Enter("VANOSMBSetSpotlight", kEffect, enable ? "true" : "false");
     if (answer.value_or(0) >= 0) {
         FakePlatform::Get().spotlight = enable;
     }
@@ -447,16 +464,14 @@ bool MonitorQueue::Upsert(const MonitorQueue &queue, const std::string &consumer
         queue.description.isObject() ? queue.description["queue"] : Json::Value::nullSingleton();
     FakePlatform::Get().AddMonitorCall({"Upsert", location.isString() ? location.asString() : "",
                                         consumer, type, queue.description});
-    return Simple("MonitorQueue::Upsert",
-                  CompactText(queue.description) + ", " + consumer + ", " + std::to_string(type),
-                  1) != 0;
+    return Enter("MonitorQueue::Upsert", kEffect, queue.description, consumer, type).value_or(1) !=
+           0;
 }
 
 bool MonitorQueue::Delete(const std::string &queue, const std::string &consumer,
                           _tag_monitor_queue_type_ type) {
     FakePlatform::Get().AddMonitorCall({"Delete", queue, consumer, type, {}});
-    return Simple("MonitorQueue::Delete", queue + ", " + consumer + ", " + std::to_string(type),
-                  1) != 0;
+    return Enter("MonitorQueue::Delete", kEffect, queue, consumer, type).value_or(1) != 0;
 }
 
 } // namespace VANO::VANOTIFYD

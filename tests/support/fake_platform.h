@@ -24,6 +24,7 @@
 #include <optional>
 #include <set>
 #include <string>
+#include <string_view>
 #include <vector>
 
 struct _tag_VANOSHARE;
@@ -97,9 +98,13 @@ class FakePlatform {
     int lastErrorLine = 0;               // VLIBCErrorGetLine
     std::vector<MonitorCall> monitorCalls;
 
+    // For benchmarks: calls are neither recorded nor counted, and no set answer is looked for.
+    bool quiet = false;
+
     // For the definitions of the platform's functions: records the call and finds a set answer.
-    std::optional<int> Enter(const std::string &function, const std::string &arguments,
-                             bool query = false);
+    std::optional<int> Enter(const std::string &function, const std::string &arguments, bool query);
+    // The share whose directory is the path or lies above it; null when there is none.
+    FakeShare *FindShareOfPath(std::string_view fullPath);
     void Violation(const std::string &text);
     void AddMonitorCall(MonitorCall call);
     void AddMonitorQueue(int count);
