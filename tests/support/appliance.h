@@ -14,23 +14,23 @@
 
 namespace VANO::TESTS {
 
-inline constexpr char kSettingsDirectory[] = "/usr/vano/etc/fileindex";
-inline constexpr char kFolderFile[] = "/usr/vano/etc/fileindex/folder.conf";
-inline constexpr char kFolderLock[] = "/tmp/fileidx_cfg_folder.lock";
-inline constexpr char kStatusFile[] = "/usr/vano/etc/fileindex/status.conf";
-inline constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
-inline constexpr char kShareTable[] = "/usr/vano/etc/shares.json";
-inline constexpr char kMonitorDirectory[] = "/usr/vano/etc/vanotifyd";
-inline constexpr char kDaemonSocket[] = "/var/run/fileindexd.sock";
-inline constexpr char kQueueName[] = "VANO@file_index_queue";
+constexpr char kSettingsDirectory[] = "/usr/vano/etc/fileindex";
+constexpr char kFolderFile[] = "/usr/vano/etc/fileindex/folder.conf";
+constexpr char kFolderLock[] = "/tmp/fileidx_cfg_folder.lock";
+constexpr char kStatusFile[] = "/usr/vano/etc/fileindex/status.conf";
+constexpr char kStatusLock[] = "/tmp/fileidx_cfg_status.lock";
+constexpr char kShareTable[] = "/usr/vano/etc/shares.json";
+constexpr char kMonitorDirectory[] = "/usr/vano/etc/vanotifyd";
+constexpr char kDaemonSocket[] = "/var/run/fileindexd.sock";
+constexpr char kQueueName[] = "VANO@file_index_queue";
 
-inline constexpr char kPhotos[] = "/volume1/photos"; // the share that most tests have
-inline constexpr char kPhotoQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";
-inline constexpr char kPhotoTaken[] = "/volume1/photos/@eaDir/VANO@file_index_queue.tmp";
-inline constexpr char kPhotoDatabase[] = "/volume1/photos/@eaDir/VANO@.fileindexdb";
+constexpr char kPhotos[] = "/volume1/photos"; // the share that most tests have
+constexpr char kPhotoQueue[] = "/volume1/photos/@eaDir/VANO@file_index_queue";
+constexpr char kPhotoTaken[] = "/volume1/photos/@eaDir/VANO@file_index_queue.tmp";
+constexpr char kPhotoDatabase[] = "/volume1/photos/@eaDir/VANO@.fileindexdb";
 
-inline constexpr int kReindexEvent = 65536;
-inline constexpr int kSettingEvent = 131072;
+constexpr int kReindexEvent = 65536;
+constexpr int kSettingEvent = 131072;
 
 // Inside a share's directory: the queue, and the one that the daemon has taken over.
 std::string QueueOf(const std::string &directory);

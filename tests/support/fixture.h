@@ -20,7 +20,6 @@
 // was left open, one of the two lock files is locked, a file lies beside the settings files, or a
 // log line was written that no ExpectLog() has taken.
 
-#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <map>
 #include <string>
@@ -35,24 +34,13 @@
 #include "support/fake_platform.h"
 #include "support/fault.h"
 #include "support/files.h"
+#include "support/matchers.h"
 #include "support/sockets.h"
 #include "support/system_log.h"
 
 namespace VANO::TESTS {
 
 using namespace VANO::FILEINDEX;
-using ::testing::AllOf;
-using ::testing::Contains;
-using ::testing::Each;
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
-using ::testing::Field;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using ::testing::Not;
-using ::testing::SizeIs;
-using ::testing::StartsWith;
-using ::testing::UnorderedElementsAre;
 
 // Names the instances of a table-driven test by their rows' member `what`.
 struct RowName {

@@ -17,17 +17,12 @@
 
 #include "support/appliance.h"
 #include "support/files.h"
+#include "support/matchers.h"
 #include "support/sockets.h"
 #include "system/child.h"
 
 namespace VANO::TESTS {
 namespace {
-
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using ::testing::Not;
 
 const std::string kQueue = kPhotoQueue;
 const std::string kTaken = kPhotoTaken;

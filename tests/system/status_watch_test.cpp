@@ -19,14 +19,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using ::testing::Not;
-using ::testing::SizeIs;
-using ::testing::StartsWith;
-
 const std::string kQueue = kPhotoQueue;
 const std::string kTaken = kQueue + ".tmp";
 

@@ -6,11 +6,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::StartsWith;
-
 TEST_F(CtlTest, AddSavesAndTellsEverybody) {
     StartDaemon();
     const Outcome outcome = Ctl({"add", "/photos", "--photo", "--video", "--name", "Our photos"});

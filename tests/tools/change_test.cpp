@@ -7,8 +7,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::HasSubstr;
-
 struct Answer {
     const char *what;
     Words arguments;

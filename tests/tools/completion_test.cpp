@@ -9,13 +9,7 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 using ::testing::IsSupersetOf;
-using ::testing::Not;
-using ::testing::UnorderedElementsAre;
 
 struct Shell {
     const char *name;

@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "support/files.h"
+#include "support/matchers.h"
 #include "system/child.h"
 
 namespace VANO::TESTS {

@@ -8,10 +8,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::HasSubstr;
-using ::testing::Not;
-
 // --- Advice -------------------------------------------------------------------------------------
 
 TEST_F(CtlTest, ABrokenSettingsFileLeadsToTheDoctor) {

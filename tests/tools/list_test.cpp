@@ -5,10 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::HasSubstr;
-using ::testing::StartsWith;
-
 TEST_F(CtlTest, ListOfNothingIsDone) {
     const Outcome outcome = Ctl({"list"});
     EXPECT_EQ(outcome.status, kDone);

@@ -5,8 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::HasSubstr;
-
 TEST_F(CtlTest, MarksListShowsWhatIsDone) {
     PutFile(kStatus, R"({"b":true,"a":true,"c":false,"d":1,"e":"text","resume_time":0,)"
                      R"("no_space":{},"need_reindex":{}})");

@@ -5,9 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::HasSubstr;
-using ::testing::SizeIs;
-
 TEST_F(CtlTest, MigrateWithoutFoldersStopsTheDaemon) {
     EXPECT_EQ(Ctl({"migrate", "--dry-run"}).out, "Would stop fileindexd: no folder is indexed.\n");
     const Outcome outcome = Ctl({"migrate"});

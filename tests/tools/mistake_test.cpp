@@ -5,11 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::HasSubstr;
-using ::testing::Not;
-using ::testing::StartsWith;
-
 class HelpTest : public CtlTest, public ::testing::WithParamInterface<const char *> {};
 
 TEST_P(HelpTest, ShowsUsageAndExamples) {

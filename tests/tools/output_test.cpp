@@ -10,9 +10,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::IsEmpty;
-using ::testing::Not;
-
 // Through a shell, that does to standard output what `redirection` says.
 Outcome WithOutput(const std::string &redirection, const std::string &arguments) {
     return RunToEnd({"/bin/sh", "-c", "exec " FILEINDEXCTL_PATH " " + arguments + redirection});

@@ -6,11 +6,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-
 std::string LocalText(std::time_t time, const char *format = "%Y-%m-%d %H:%M") {
     std::tm local{};
     char text[64];

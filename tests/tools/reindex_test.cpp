@@ -5,8 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::HasSubstr;
-
 TEST_F(CtlTest, ReindexQueuesAnEventForEachFolder) {
     Save(kTwo);
     const Outcome outcome = Ctl({"reindex", "/photos", "/media/films"});

@@ -5,10 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-
 TEST_F(CtlTest, RemoveDropsTheSettingAndTellsTheDaemon) {
     StartDaemon();
     Save(kTwo);

@@ -5,10 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-
 TEST_F(CtlTest, SetChangesWhatIsNamedAndTellsTheDaemon) {
     StartDaemon();
     Save(kPhotos);

@@ -5,10 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-
 struct Kind {
     const char *command;
     const char *key;

@@ -6,11 +6,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using ::testing::Not;
-
 TEST_F(CtlTest, ShareRenameMovesTheFolders) {
     Save(kTwo);
     PutFile(kShares, R"({"pictures":"/volume1/pictures","media":"/volume2/media"})");

@@ -5,9 +5,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::HasSubstr;
-
 TEST_F(CtlTest, ShowShowsOneFolder) {
     Save(kTwo);
     const Outcome outcome = Ctl({"show", "/media/films"});

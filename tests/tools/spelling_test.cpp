@@ -7,10 +7,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::AllOf;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-
 TEST_F(CtlTest, AddTakesTheSharesOwnSpelling) {
     StartDaemon();
     EXPECT_EQ(Ctl({"add", "/PHOTOS", "/Photos/2016", "--photo"}).error,

@@ -6,9 +6,6 @@
 namespace VANO::TESTS {
 namespace {
 
-using ::testing::HasSubstr;
-using ::testing::Not;
-
 TEST_F(CtlTest, TablesOnATerminalHaveHeadings) {
     Save(kPhotos);
     const std::string rows = "/photos  Photos  photo  finished\r\n";
