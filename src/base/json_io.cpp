@@ -33,10 +33,9 @@ const Json::StreamWriterBuilder &WriterSettings() {
     return settings;
 }
 
-// Comments, trailing commas, and whatever stands behind a zero byte. The JSON library's settings
-// refuse some of these in some places only, so all are found here. (Its lax numbers and raw control
-// characters in strings stay: they take nothing away from what the text means.)
-bool HasLibraryExtension(std::string_view text) {
+} // namespace
+
+std::optional<JsonExtension> FindJsonExtension(std::string_view text) {
     bool inString = false;
     bool afterComma = false;
     for (std::size_t i = 0; i < text.size(); ++i) {
@@ -46,26 +45,22 @@ bool HasLibraryExtension(std::string_view text) {
             inString = c != '"';
             continue;
         }
-        if (c == '/' || c == '\0' || (afterComma && (c == '}' || c == ']'))) {
-            return true;
+        if (c == '/') {
+            return JsonExtension{i, "a comment, which JSON does not have"};
+        }
+        if (c == '\0') {
+            return JsonExtension{i, "a zero byte"};
+        }
+        if (afterComma && (c == '}' || c == ']')) {
+            return JsonExtension{i, "a comma with nothing after it"};
         }
         inString = c == '"';
         if (c != ' ' && c != '\t' && c != '\n' && c != '\r') {
             afterComma = c == ',';
         }
     }
-    return false;
+    return std::nullopt;
 }
-
-std::string WriteWithLibrary(const Json::Value &value) {
-    std::ostringstream text;
-    text.exceptions(std::ios::badbit); // without memory it would just end early
-    const std::unique_ptr<Json::StreamWriter> writer(WriterSettings().newStreamWriter());
-    writer->write(value, &text);
-    return text.str();
-}
-
-} // namespace
 
 JsonParser::JsonParser() = default;
 JsonParser::~JsonParser() = default;
@@ -81,7 +76,7 @@ bool JsonParser::Parse(Json::Value &value, std::string_view text) {
 
 bool JsonParser::ParseWithLibrary(Json::Value &value, std::string_view text) {
     if (reader_ == nullptr) {
-        reader_.reset(ReaderSettings().newCharReader()); // as dear as reading an event
+        reader_.reset(ReaderSettings().newCharReader()); // costs as much as parsing an event
     }
     Json::Value parsed;
     try {
@@ -91,7 +86,7 @@ bool JsonParser::ParseWithLibrary(Json::Value &value, std::string_view text) {
     } catch (const Json::Exception &) {
         return false; // nested too deep
     }
-    if (HasLibraryExtension(text)) {
+    if (FindJsonExtension(text)) {
         return false;
     }
     value.swap(parsed);
@@ -117,11 +112,11 @@ bool JsonToFile(const Json::Value &value, const std::string &path) {
 }
 
 std::string JsonToString(const Json::Value &value) {
-    std::string text;
-    if (!WritePlainValue(text, value)) {
-        text = WriteWithLibrary(value);
-    }
-    return text;
+    std::ostringstream text;
+    text.exceptions(std::ios::badbit); // without memory it would just end early
+    const std::unique_ptr<Json::StreamWriter> writer(WriterSettings().newStreamWriter());
+    writer->write(value, &text);
+    return text.str();
 }
 
 std::string JsonToMessageText(const Json::Value &value) {

@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <json/value.h>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -36,6 +37,15 @@ class JsonParser {
   private:
     std::unique_ptr<Json::CharReader> reader_;
 };
+
+// What the JSON library takes in some places and this reader refuses: comments, trailing commas,
+// and whatever stands behind a zero byte. (The library's lax numbers and raw control characters in
+// strings are taken: they take nothing away from what the text means.)
+struct JsonExtension {
+    std::size_t offset;
+    const char *what; // "a comma with nothing after it"
+};
+[[nodiscard]] std::optional<JsonExtension> FindJsonExtension(std::string_view text);
 
 // One text through a parser of its own.
 [[nodiscard]] bool JsonFromString(Json::Value &value, std::string_view text);

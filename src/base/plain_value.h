@@ -2,7 +2,6 @@
 #define FILEINDEX_BASE_PLAIN_VALUE_H
 
 #include <json/value.h>
-#include <string>
 #include <string_view>
 
 namespace VANO::FILEINDEX {
@@ -11,11 +10,6 @@ namespace VANO::FILEINDEX {
 // of it, at a fraction of its cost. False when only the JSON library can tell what the text is;
 // `value` is unspecified then.
 [[nodiscard]] bool ReadPlainValue(Json::Value &value, std::string_view text);
-
-// Appends the compact text that the JSON library would write for a value: one without fractions,
-// characters to escape, deep nesting and arrays with holes. False when the JSON library must write
-// it; the end of `text` is unspecified then.
-[[nodiscard]] bool WritePlainValue(std::string &text, const Json::Value &value);
 
 } // namespace VANO::FILEINDEX
 

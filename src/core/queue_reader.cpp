@@ -16,7 +16,8 @@ namespace {
 // Ends a line that was cut: no JSON object ends so.
 constexpr std::string_view kCutMark = "...";
 
-constexpr std::size_t kFirstBufferBytes = std::size_t{64} * 1024;
+constexpr std::size_t kLeastBufferBytes = 1024;
+constexpr std::size_t kUsualBufferBytes = std::size_t{64} * 1024;
 constexpr std::size_t kMaxBufferBytes = kMaxEventBytes + 1; // one more tells that a line is longer
 
 // With room for the mark.
@@ -32,11 +33,14 @@ QueueReader::QueueReader(const ShareFile &queue) : file_(queue.Open(O_RDONLY)) {
         file_ = UniqueFd();
         errno = EINVAL;
     }
+    // A byte more than there seem to be, so that one read finds the end.
+    const auto wanted = static_cast<std::size_t>(info.st_size) + 1;
+    firstSize_ = std::clamp(wanted, kLeastBufferBytes, kUsualBufferBytes);
 }
 
 // Doubles the buffer, up to what the longest line needs.
 void QueueReader::Grow() {
-    size_ = size_ == 0 ? kFirstBufferBytes : std::min(2 * size_, kMaxBufferBytes);
+    size_ = size_ == 0 ? firstSize_ : std::min(2 * size_, kMaxBufferBytes);
     std::unique_ptr<char[]> larger = MakeBuffer(size_);
     std::copy_n(buffer_.get(), end_, larger.get());
     buffer_ = std::move(larger);

@@ -35,6 +35,7 @@ class QueueReader {
 
     UniqueFd file_;
     std::unique_ptr<char[]> buffer_;
+    std::size_t firstSize_ = 0; // of the buffer
     std::size_t size_ = 0;
     std::size_t begin_ = 0;
     std::size_t end_ = 0;

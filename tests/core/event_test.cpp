@@ -105,6 +105,31 @@ TEST_F(EventTest, UsualEventsNeedNoJsonLibrary) {
     }
 }
 
+TEST_F(EventTest, ALineIsWhatTheJsonLibraryWrites) {
+    JsonTexts texts(20170402);
+    std::vector<Json::Value> values;
+    for (std::size_t number = 0; number < 2000; ++number) {
+        Json::Value value;
+        if (JsonFromString(value, texts.Settings())) {
+            values.push_back(value);
+        }
+    }
+    ASSERT_GT(values.size(), 500U);
+    std::string bytes; // each alone, and all in one path
+    for (int byte = 0; byte < 256; ++byte) {
+        bytes += static_cast<char>(byte);
+    }
+    for (std::size_t number = 0; number < values.size(); ++number) {
+        Json::Value object(Json::objectValue);
+        object["event"] = static_cast<int>(number) - 100;
+        object["path"] = number < 256 ? bytes.substr(number, 1) : number == 256 ? bytes : "/v/a";
+        object["data"] = values[number];
+        ASSERT_EQ(FILEINDEX::EventLine(object["event"].asInt(), object["path"].asString(),
+                                       object["data"]),
+                  JsonToString(object) + "\n");
+    }
+}
+
 } // namespace
 
 } // namespace VANO::TESTS
