@@ -13,6 +13,7 @@ namespace CTL::DOCTOR {
 
 namespace {
 
+using VANO::FILEINDEX::FindJsonExtension;
 using VANO::FILEINDEX::JsonFromString;
 using VANO::FILEINDEX::kMaxJsonFileBytes;
 using VANO::FILEINDEX::ReadFile;
@@ -25,38 +26,10 @@ struct Place {
     std::string what;
 };
 
-// The first thing that the JSON library takes and the settings' rules do not.
-std::optional<Place> FindExtension(const std::string &text) {
-    bool inString = false;
-    bool afterComma = false;
-    for (std::size_t i = 0; i < text.size(); ++i) {
-        const char c = text[i];
-        if (inString) {
-            i += c == '\\' ? 1 : 0;
-            inString = c != '"';
-            continue;
-        }
-        if (c == '/') {
-            return Place{i, "a comment, which JSON does not have"};
-        }
-        if (c == '\0') {
-            return Place{i, "a zero byte"};
-        }
-        if (afterComma && (c == '}' || c == ']')) {
-            return Place{i, "a comma with nothing after it"};
-        }
-        inString = c == '"';
-        if (c != ' ' && c != '\t' && c != '\n' && c != '\r') {
-            afterComma = c == ',';
-        }
-    }
-    return std::nullopt;
-}
-
 // What no JSON reader takes; throws where the nesting is too deep. Only this reader of the library
 // tells places otherwise than in a text for people.
 std::optional<Place> FindError(const std::string &text) {
-    Json::Features features; // comments are what FindExtension() explains
+    Json::Features features; // comments are what FindJsonExtension() explains
     features.strictRoot_ = false;
     Json::Reader reader(features);
     Json::Value value;
@@ -100,7 +73,10 @@ void Locate(JsonMistake &mistake, const std::string &text, std::size_t offset) {
 
 JsonMistake FindMistake(const std::string &text) {
     JsonMistake mistake;
-    std::optional<Place> place = FindExtension(text);
+    std::optional<Place> place;
+    if (const auto extension = FindJsonExtension(text)) {
+        place = Place{extension->offset, extension->what};
+    }
     try {
         const std::optional<Place> error = FindError(text);
         place = error && (!place || error->offset < place->offset) ? error : place;
