@@ -292,22 +292,6 @@ INSTANTIATE_TEST_SUITE_P(
                       Malformed{"TooDeep", std::string(100000, '['), 0, 0, "nested too deep"}),
     [](const auto &row) { return row.param.what; });
 
-TEST_F(DoctorTest, TheMalformedLineIsQuotedShortAndSafe) {
-    PutFile(kStatus, "{\n" + std::string(300, ' ') + "\"\xC3\xA4\x1b[31m\xff\": oops, " +
-                         std::string(300, 'x') + "\n}");
-    const std::string out = Doctor({"settings"}).out;
-    const Words lines = LinesOf(out);
-    const auto quoted = std::find_if(lines.begin(), lines.end(), [](const std::string &line) {
-        return line.find("oops") != std::string::npos;
-    });
-    ASSERT_NE(quoted, lines.end()) << out;
-    EXPECT_LE(quoted->size(), 100U);
-    EXPECT_THAT(*quoted, AllOf(StartsWith("             ..."), HasSubstr("\xC3\xA4\\x1b[31m\\xff"),
-                               ::testing::EndsWith("...")));
-    // The mark stands below the place; the one wide letter has two bytes.
-    EXPECT_EQ((quoted + 1)->size() + 1, quoted->find("oops") + 1);
-}
-
 TEST_F(DoctorTest, WhatIsNoFileIsUnreadableAndHoldsNobodyUp) {
     ASSERT_EQ(::mkfifo(kFolders, 0644), 0);
     MakeDirs(kStatus);
@@ -966,8 +950,6 @@ TEST_F(DoctorTest, OnATerminalLinesFitAndMarksAreColoured) {
               "  error    /usr/vano/etc/fileindex/status.conf is not JSON:\r\n"
               "           line 1, column 2\r\n"
               "           Missing '}' or object member name\r\n"
-              "             {\r\n"
-              "              ^\r\n"
               "           Fix it by hand, or restore it from a backup.\r\n"
               "           Moved away, it counts as empty.\r\n"
               "             editor /usr/vano/etc/fileindex/status.conf\r\n"

@@ -154,10 +154,9 @@ TEST_F(CtlTest, QueryWhySaysThatAFileIsOfAnotherType) {
 
 TEST_F(CtlTest, QueryWhyNamesTheSettingOfAShareThatIsGone) {
     Save(R"({"/gone":{"photo":true},"/gone/x":{}})");
-    EXPECT_EQ(Ctl({"query", "--why", "/gone/x/y"}).out,
-              "indexed  /gone/x/y\n"
-              "  by /gone/x, for no file types\n"
-              "  but left out: no share has that name\n");
+    EXPECT_EQ(Ctl({"query", "--why", "/gone/x/y"}).out, "indexed  /gone/x/y\n"
+                                                        "  by /gone/x, for no file types\n"
+                                                        "  but left out: no share has that name\n");
 }
 
 TEST_F(CtlTest, QueryWhyNamesTheDeepestFolder) {

@@ -2,7 +2,7 @@
 #include <memory>
 
 #include "commands/command.h"
-#include "doctor/report.h"
+#include "doctor/checks.h"
 #include "terminal/output.h"
 
 namespace CTL {

@@ -3,7 +3,7 @@
 
 #include "commands/change.h"
 #include "commands/command.h"
-#include "state/status_file.h"
+#include "state/known_shares.h"
 #include "terminal/messages.h"
 #include "terminal/output.h"
 #include "terminal/text.h"

@@ -23,7 +23,6 @@ struct Finding {
     std::string subject;
     std::string what;
     std::string why;
-    std::vector<std::string> quote;                       // lines to be shown as they are
     std::string fix;                                      // what to do about it
     std::string command;                                  // a command line towards that
     Json::Value details = Json::Value(Json::objectValue); // further facts for scripts

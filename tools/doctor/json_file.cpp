@@ -13,13 +13,9 @@ namespace CTL::DOCTOR {
 
 namespace {
 
-using VANO::FILEINDEX::FindJsonExtension;
 using VANO::FILEINDEX::JsonFromString;
 using VANO::FILEINDEX::kMaxJsonFileBytes;
 using VANO::FILEINDEX::ReadFile;
-
-constexpr std::size_t kBytesBefore = 40; // of the quoted line, on each side of the mistake
-constexpr std::size_t kBytesAfter = 20;
 
 struct Place {
     std::size_t offset;
@@ -41,54 +37,30 @@ std::optional<Place> FindError(const std::string &text) {
     const std::size_t extra = text.find_first_not_of(" \t\r\n", end);
     return extra == std::string::npos
                ? std::nullopt
-               : std::optional<Place>(Place{extra, "Extra text behind the value"});
-}
-
-bool IsInsideCharacter(char c) {
-    return (static_cast<unsigned char>(c) & 0xC0U) == 0x80U;
-}
-
-void Locate(JsonMistake &mistake, const std::string &text, std::size_t offset) {
-    const std::size_t newline = offset == 0 ? std::string::npos : text.rfind('\n', offset - 1);
-    const std::size_t lineBegin = newline == std::string::npos ? 0 : newline + 1;
-    const std::size_t lineEnd = std::min(text.find('\n', offset), text.size());
-    const auto at = text.begin() + static_cast<std::ptrdiff_t>(offset);
-    mistake.line = static_cast<std::size_t>(std::count(text.begin(), at, '\n')) + 1;
-    mistake.column = offset - lineBegin + 1;
-
-    std::size_t begin = std::max(lineBegin + kBytesBefore, offset) - kBytesBefore;
-    std::size_t end = std::min(offset + kBytesAfter, lineEnd);
-    while (begin < offset && begin > lineBegin && IsInsideCharacter(text[begin])) {
-        ++begin;
-    }
-    while (end < lineEnd && IsInsideCharacter(text[end])) {
-        ++end;
-    }
-    const std::string before =
-        (begin > lineBegin ? "..." : "") + Shown(text.substr(begin, offset - begin));
-    mistake.quote = {before + Shown(text.substr(offset, end - offset)) +
-                         (end < lineEnd ? "..." : ""),
-                     std::string(Columns(before), ' ') + "^"};
+               : std::optional<Place>(Place{extra, "Extra text after the value"});
 }
 
 JsonMistake FindMistake(const std::string &text) {
-    JsonMistake mistake;
+    const auto extension = VANO::FILEINDEX::FindJsonExtension(text);
     std::optional<Place> place;
-    if (const auto extension = FindJsonExtension(text)) {
+    if (extension) {
         place = Place{extension->offset, extension->what};
     }
     try {
         const std::optional<Place> error = FindError(text);
         place = error && (!place || error->offset < place->offset) ? error : place;
     } catch (const Json::Exception &) {
-        mistake.what = "it is nested too deep";
-        return mistake;
+        return {0, 0, "it is nested too deep"};
     }
-    if (place) {
-        mistake.what = place->what;
-        Locate(mistake, text, place->offset);
+    if (!place) {
+        return {};
     }
-    return mistake;
+    const auto at = text.begin() + static_cast<std::ptrdiff_t>(place->offset);
+    const std::size_t newline =
+        place->offset == 0 ? std::string::npos : text.rfind('\n', place->offset - 1);
+    return {static_cast<std::size_t>(std::count(text.begin(), at, '\n')) + 1,
+            newline == std::string::npos ? place->offset + 1 : place->offset - newline,
+            place->what};
 }
 
 std::string PlaceOf(const JsonMistake &mistake) {
@@ -129,7 +101,6 @@ std::optional<Finding> MistakeOf(const JsonFile &file, const std::string &prefix
     Finding finding = Error(prefix + "-malformed", file.path,
                             Shown(file.path) + " is not JSON" + PlaceOf(mistake));
     finding.why = mistake.what;
-    finding.quote = mistake.quote;
     if (mistake.line > 0) {
         finding.details["line"] = Json::UInt64(mistake.line);
         finding.details["column"] = Json::UInt64(mistake.column);

@@ -17,7 +17,6 @@ struct JsonMistake {
     std::size_t line = 0; // 0 when the place cannot be told
     std::size_t column = 0;
     std::string what;
-    std::vector<std::string> quote; // the line around it, fit for a terminal, and a mark below it
 };
 
 // A file that should hold JSON, by the library's own rules. Whatever stands in its place, looking

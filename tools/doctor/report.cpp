@@ -1,4 +1,4 @@
-#include "doctor/report.h"
+#include "doctor/checks.h"
 
 #include <algorithm>
 #include <iostream>
@@ -48,9 +48,6 @@ void PrintFinding(const Finding &finding) {
     std::cout << "  " << Coloured(word, mark.colour, MayUseColour()) << text.substr(2 + word.size())
               << '\n';
     PrintParagraph(finding.why);
-    for (const std::string &line : finding.quote) {
-        std::cout << std::string(kCommandIndent, ' ') << line << '\n';
-    }
     PrintParagraph(finding.fix);
     if (!finding.command.empty()) {
         std::cout << std::string(kCommandIndent, ' ')

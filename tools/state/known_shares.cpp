@@ -1,14 +1,14 @@
 
+#include <fileindex/error_handler.h>
 #include <fileindex/index_mgr.h>
 #include <fileindex/share_path.h>
+#include <fileindex/status.h>
 #include <fileindex/status_mgr.h>
-#include <json/value.h>
 #include <map>
 #include <platform/diagnosis.h>
 
 #include "core/share.h"
 #include "state/known_shares.h"
-#include "state/status_file.h"
 #include "terminal/messages.h"
 
 namespace CTL {
@@ -106,6 +106,19 @@ bool LookUpShare(MarkedShare &share, const std::string &typed) {
             share = WithMarks(std::move(known));
         }
     }
+    return true;
+}
+
+bool LoadStatus(Json::Value &status) {
+    VANO::FILEINDEX::Status file;
+    if (!file.Load()) {
+        return false;
+    }
+    if (!file.root.isObject()) {
+        VANO::FILEINDEX::ErrorHandler::SetError(VANO::FILEINDEX::FILEINDEX_ERR_MALFORMED);
+        return false;
+    }
+    status = file.root;
     return true;
 }
 

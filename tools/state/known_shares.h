@@ -2,6 +2,7 @@
 #define FILEINDEXCTL_STATE_KNOWN_SHARES_H
 
 #include <fileindex/folder.h>
+#include <json/value.h>
 #include <set>
 #include <string>
 #include <vector>
@@ -41,6 +42,10 @@ struct MarkedShare : KnownShare {
 
 // Of a single share by NameOfShare(), whether there is one of that name or not.
 [[nodiscard]] bool LookUpShare(MarkedShare &share, const std::string &typed);
+
+// The status file's document, for what the library answers by name only. False, with the last error
+// saying why, when it cannot be read or is no object.
+[[nodiscard]] bool LoadStatus(Json::Value &status);
 
 } // namespace CTL
 

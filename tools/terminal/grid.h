@@ -28,6 +28,8 @@ class Grid {
   public:
     explicit Grid(std::vector<GridColumn> columns) : columns_(std::move(columns)) {}
 
+    [[nodiscard]] std::size_t Size() const { return columns_.size(); } // columns
+
     // What the columns but the first need, the gaps included.
     [[nodiscard]] std::size_t WidthBesideFirst() const;
 

@@ -1,6 +1,6 @@
 #include "terminal/help.h"
 
-#include <sstream>
+#include "terminal/text.h"
 
 namespace CTL {
 
@@ -30,20 +30,10 @@ std::string Entry(const std::string &name, const std::string &description) {
         entry += "\n";
         column = 0;
     }
-    entry += std::string(kNameColumns - column, ' ');
-    column = kNameColumns;
-    std::istringstream words(description);
-    for (std::string word; words >> word;) {
-        if (column + word.size() > kColumns) {
-            entry.back() = '\n';
-            entry += std::string(kNameColumns, ' ');
-            column = kNameColumns;
-        }
-        entry += word + ' ';
-        column += word.size() + 1;
-    }
-    entry.back() = '\n';
-    return entry;
+    // The blanks at its beginning stand for the name.
+    const std::string text =
+        Wrapped(std::string(kNameColumns, ' ') + description, kColumns, kNameColumns);
+    return entry + text.substr(column) + "\n";
 }
 
 } // namespace

@@ -24,14 +24,6 @@ std::string JsonModeNumber(const std::string &word) {
     throw CLI::ValidationError("must be short, pretty or off, not '" + word + "'");
 }
 
-std::vector<GridColumn> ColumnsUnder(const std::vector<std::string> &headings) {
-    std::vector<GridColumn> columns(headings.size());
-    for (std::size_t i = 0; i < headings.size(); ++i) {
-        columns[i].heading = headings[i];
-    }
-    return columns;
-}
-
 } // namespace
 
 void AddJsonOption(CLI::App &app, JsonMode &mode) {
@@ -57,24 +49,26 @@ void PrintJson(const Json::Value &value, JsonMode mode) {
     std::cout << ShownJson(Json::writeString(builder, value)) << '\n';
 }
 
-void PrintGrid(const Grid &grid) {
-    const std::vector<std::string> lines =
-        IsTerminal(STDOUT_FILENO) ? grid.Lines(LineWidth(STDOUT_FILENO), StyleOfOutput())
-                                  : grid.Rows();
-    for (const std::string &line : lines) {
-        std::cout << line << '\n';
+Table::Table(const std::vector<std::string> &headings) : grid_({}) {
+    for (const std::string &heading : headings) {
+        grid_.Insert(grid_.Size(), {heading});
     }
 }
 
-Table::Table(const std::vector<std::string> &headings) : grid_(ColumnsUnder(headings)) {}
-
 void Table::Add(const std::vector<std::string> &cells) {
     std::vector<std::string> row;
-    row.reserve(cells.size());
     for (const std::string &cell : cells) {
         row.push_back(cell.empty() ? "-" : Shown(cell));
     }
     grid_.Add(row);
+}
+
+void Table::Print() const {
+    const bool isTerminal = IsTerminal(STDOUT_FILENO);
+    for (const std::string &line :
+         isTerminal ? grid_.Lines(LineWidth(STDOUT_FILENO), StyleOfOutput()) : grid_.Rows()) {
+        std::cout << line << '\n';
+    }
 }
 
 } // namespace CTL

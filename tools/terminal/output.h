@@ -25,10 +25,6 @@ void AddJsonOption(CLI::App &app, JsonMode &mode);
 // drive a terminal stands in it as it is. Nothing for kOff.
 void PrintJson(const Json::Value &value, JsonMode mode);
 
-// To standard output: on a terminal under headings and no wider than it, elsewhere the rows alone,
-// whole.
-void PrintGrid(const Grid &grid);
-
 // Rows of text under headings.
 class Table {
   public:
@@ -43,7 +39,9 @@ class Table {
     // As many cells as there are headings; an empty one shows as "-".
     void Add(const std::vector<std::string> &cells);
 
-    void Print() const { PrintGrid(grid_); }
+    // To standard output: on a terminal under headings and no wider than it, elsewhere the rows
+    // alone, whole.
+    void Print() const;
 
   private:
     Grid grid_;
