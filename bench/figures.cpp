@@ -39,8 +39,9 @@ thread_local std::size_t g_allocations = 0;
 
 } // namespace
 
-// These stand before the C++ library's in every shared library too.
-void *operator new(std::size_t size) {
+// These stand before the C++ library's in every shared library too; inlined, one without the other
+// would look like a mismatch.
+[[gnu::noinline]] void *operator new(std::size_t size) {
     ++g_allocations;
     if (void *memory = std::malloc(size != 0 ? size : 1)) {
         return memory;
@@ -48,11 +49,11 @@ void *operator new(std::size_t size) {
     throw std::bad_alloc();
 }
 
-void operator delete(void *memory) noexcept {
+[[gnu::noinline]] void operator delete(void *memory) noexcept {
     std::free(memory);
 }
 
-void operator delete(void *memory, std::size_t /*size*/) noexcept {
+[[gnu::noinline]] void operator delete(void *memory, std::size_t /*size*/) noexcept {
     std::free(memory);
 }
 

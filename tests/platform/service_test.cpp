@@ -188,9 +188,10 @@ class SystemdTest : public ::testing::Test {
     // It must never ask anybody for a password: the caller holds a lock meanwhile.
     static void PutSystemctl(const std::string &failing) {
         MakeDirs("/tmp/programs");
-        PutProgram("/tmp/programs/systemctl", std::string("[ \"$1\" = --no-ask-password ] || exit 9; shift\n"
-                                                 "echo \"$*\" >>") +
-                                         kCalls + "\n[ \"$1\" != " + failing + " ]\n");
+        PutProgram("/tmp/programs/systemctl",
+                   std::string("[ \"$1\" = --no-ask-password ] || exit 9; shift\n"
+                               "echo \"$*\" >>") +
+                       kCalls + "\n[ \"$1\" != " + failing + " ]\n");
     }
 
     std::unique_ptr<Mount> programs_;

@@ -310,20 +310,20 @@ void PollBefore() {
 using namespace VANO::TESTS;
 
 // Tells a hook of a call; `return` with its result when it has one, otherwise does what follows.
-#define FILEINDEX_TELL(type, kind, description, ...)                                               \
+#define FILEINDEX_TELL(type, kind, description, afterwards)                                        \
     if (IsActive(kind)) {                                                                          \
         CallInfo told = description;                                                               \
         if (const auto result = Enter(told)) {                                                     \
             return static_cast<type>(*result);                                                     \
         }                                                                                          \
-        __VA_ARGS__;                                                                               \
+        afterwards;                                                                                \
     }
 
 // A function as the C library's headers have it. `call` makes the call by `next`, the C library's.
 #define FILEINDEX_FUNCTION(type, name, parameters, kind, description, call)                        \
     type name parameters {                                                                         \
         static const auto next = Next<decltype(&::name)>(#name);                                   \
-        FILEINDEX_TELL(type, kind, description)                                                    \
+        FILEINDEX_TELL(type, kind, description, (void)0)                                           \
         return call;                                                                               \
     }
 
@@ -334,7 +334,7 @@ using namespace VANO::TESTS;
         va_start(arguments, flags);                                                                \
         const mode_t mode = ModeOfOpen(flags, arguments);                                          \
         va_end(arguments);                                                                         \
-        FILEINDEX_TELL(int, KindOfOpen(flags), description)                                        \
+        FILEINDEX_TELL(int, KindOfOpen(flags), description, (void)0)                               \
         return next(__VA_ARGS__, flags, mode);                                                     \
     }
 

@@ -28,7 +28,6 @@ constexpr char kMetadataDir[] = "/volume1/photos/@eaDir";
 //
 //     /volume2/outside/@eaDir/VANO@file_index_queue    "precious\n"
 //     /volume2/outside/@eaDir/VANO@.fileindexdb/       (made by some tests)
-constexpr char kOutside[] = "/volume2/outside";
 constexpr char kOutsideDir[] = "/volume2/outside/@eaDir";
 constexpr char kOutsideQueue[] = "/volume2/outside/@eaDir/VANO@file_index_queue";
 
