@@ -5,7 +5,9 @@
 #   place   a directory with room, mounted by make_system
 #   root    the system's root directory in it
 
-readonly SUITE=bookworm
+# The release of this machine, for which its packages are built.
+SUITE=$(. /etc/os-release && echo "${VERSION_CODENAME-}")
+readonly SUITE
 readonly SIZE=3G
 readonly EXIT_CANNOT=77 # the usual code for a skipped test
 
