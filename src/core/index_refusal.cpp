@@ -1,5 +1,6 @@
 #include "core/index_refusal.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <climits>
@@ -17,12 +18,8 @@ constexpr int kUnknownFileSystem = -1;
 constexpr int kUserSpaceFileSystem = 12; // neither quota nor reliable change events
 
 bool IsExcluded(std::string_view share) {
-    for (const std::string_view name : kExcludedShares) {
-        if (share == name) {
-            return true;
-        }
-    }
-    return false;
+    return std::find(kExcludedShares.begin(), kExcludedShares.end(), share) !=
+           kExcludedShares.end();
 }
 
 // A share that uses encryption is a mount of its own; so is one that cannot be asked.

@@ -11,7 +11,7 @@
 
 namespace VANO::FILEINDEX {
 
-QueueLock::QueueLock(const ShareFile &queue) : outcome_(Outcome::kBusy) {
+QueueLock::QueueLock(const ShareFile &queue) {
     bool wasTakenOver = false;
     for (int attempt = 0; attempt < kLockAttempts; ++attempt) {
         outcome_ = Try(queue);

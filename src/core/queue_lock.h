@@ -40,7 +40,7 @@ class QueueLock {
     [[nodiscard]] Outcome Try(const ShareFile &queue);
 
     UniqueFd file_;
-    Outcome outcome_;
+    Outcome outcome_ = Outcome::kBusy;
     int error_ = 0;
 };
 

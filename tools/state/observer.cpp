@@ -41,9 +41,10 @@ std::optional<long long> ReadResumeTime() {
 
 bool Observer::IsAsked(const std::string &path) const {
     return paths_.empty() ||
-           std::any_of(paths_.begin(), paths_.end(), [&](const std::string &asked) {
-               return fileindex::IsSameOrBelow(path, asked) ||
-                      fileindex::IsSameOrBelow(asked, path);
+           std::any_of(paths_.begin(), paths_.end(), [&](const std::string &other) {
+               // NOLINTNEXTLINE(readability-suspicious-call-argument): either may hold the other
+               return fileindex::IsSameOrBelow(path, other) ||
+                      fileindex::IsSameOrBelow(other, path);
            });
 }
 

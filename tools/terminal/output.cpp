@@ -57,6 +57,7 @@ Table::Table(const std::vector<std::string> &headings) : grid_({}) {
 
 void Table::Add(const std::vector<std::string> &cells) {
     std::vector<std::string> row;
+    row.reserve(cells.size());
     for (const std::string &cell : cells) {
         row.push_back(cell.empty() ? "-" : Shown(cell));
     }
