@@ -6,6 +6,7 @@
 #include <fileindex/share_path.h>
 #include <fileindex/status.h>
 #include <fileindex/status_mgr.h>
+#include <tuple>
 
 #include "core/folder_cover.h"
 
@@ -41,10 +42,10 @@ std::optional<long long> ReadResumeTime() {
 
 bool Observer::IsAsked(const std::string &path) const {
     return paths_.empty() ||
-           std::any_of(paths_.begin(), paths_.end(), [&](const std::string &other) {
-               // NOLINTNEXTLINE(readability-suspicious-call-argument): either may hold the other
-               return fileindex::IsSameOrBelow(path, other) ||
-                      fileindex::IsSameOrBelow(other, path);
+           std::any_of(paths_.begin(), paths_.end(), [&](const std::string &asked) {
+               const auto [outer, inner] =
+                   path.size() < asked.size() ? std::tie(path, asked) : std::tie(asked, path);
+               return fileindex::IsSameOrBelow(inner, outer);
            });
 }
 
